@@ -1,0 +1,159 @@
+#include "kiv/reg.h"
+
+#include "kiv/socket.h"
+#include "standin.h"
+
+#include <array>
+#include <cstdio>
+#include <cstring>
+#include <mutex>
+#include <unistd.h>
+
+struct registration {
+    int module_id; // 0: a free row
+    std::array<uint32_t, 4> masks;
+};
+
+// A registration request as it crosses the bus.
+struct reg_request {
+    uint16_t us_cmd;
+    uint16_t us_reserved1;
+    uint16_t us_dest_module_id;
+    uint16_t us_source_module_id;
+    uint16_t us_data_len;
+    uint16_t us_reserved2;
+    reg_masks masks;
+};
+static_assert(sizeof(reg_request) == 28, "reg_request crosses the bus");
+
+static std::mutex table_lock;
+static bool table_ready;
+static std::array<registration, 64> table;
+
+static bool is_module_id(int module_id)
+{
+    return module_id > 0 && module_id <= UINT16_MAX;
+}
+
+static int init_table(int module_id)
+{
+    if (!is_module_id(module_id) || standin_device_dir() < 0)
+        return -1;
+    const std::lock_guard guard(table_lock);
+    // The folder shows this process's table, which starts empty.
+    for (registration &row : table) {
+        char path[32];
+        snprintf(path, sizeof path, "reg/%d", row.module_id);
+        if (row.module_id != 0)
+            unlinkat(standin_device_dir(), path, 0);
+        row = {};
+    }
+    table_ready = true;
+    return 0;
+}
+
+static registration *find_row(int module_id)
+{
+    for (registration &row : table) {
+        if (row.module_id == module_id || row.module_id == 0)
+            return &row;
+    }
+    return nullptr;
+}
+
+static int record_request(int source_module_id, const uint32_t *masks)
+{
+    char name[16];
+    char text[64];
+    if (!is_module_id(source_module_id) || masks == nullptr)
+        return 0;
+    const std::lock_guard guard(table_lock);
+    registration *row = table_ready ? find_row(source_module_id) : nullptr;
+    if (row == nullptr)
+        return 0;
+    snprintf(name, sizeof name, "%d", source_module_id);
+    const int length = snprintf(text, sizeof text, "0x%x 0x%x 0x%x 0x%x", masks[0], masks[1], masks[2], masks[3]);
+    if (standin_write_text("reg", name, text, length) != 0)
+        return 0;
+    row->module_id = source_module_id;
+    memcpy(row->masks.data(), masks, sizeof row->masks);
+    return 1;
+}
+
+static int send_request(int source_module_id, int dest_module_id, const reg_masks *masks)
+{
+    const char *queue_name = standin_module_queue(source_module_id);
+    if (queue_name == nullptr || !is_module_id(dest_module_id) || masks == nullptr)
+        return -1;
+    const reg_request request = {
+        .us_cmd = MSG_CMD_SERVICE_REG,
+        .us_reserved1 = 0,
+        .us_dest_module_id = static_cast<uint16_t>(source_module_id),
+        .us_source_module_id = static_cast<uint16_t>(dest_module_id),
+        .us_data_len = sizeof request.masks,
+        .us_reserved2 = 0,
+        .masks = *masks,
+    };
+    return standin_send(queue_name, &request, sizeof request, STANDIN_SEND_WAIT_MS) == 0 ? 0 : -1;
+}
+
+static void trace_masks(trace_line &line, const uint32_t *masks)
+{
+    if (masks == nullptr)
+        trace_add(line, "null");
+    else
+        trace_add(line, "0x%x 0x%x 0x%x 0x%x", masks[0], masks[1], masks[2], masks[3]);
+}
+
+int kiv_reg_table_init(int module_id)
+{
+    if (standin_watched == 0)
+        return init_table(module_id);
+    trace_line line;
+    int result = 0;
+    trace_begin(line, "kiv_reg_table_init");
+    trace_add(line, "%d", module_id);
+    if (trace_fault(line, &result))
+        return result;
+    result = init_table(module_id);
+    trace_result(line, result);
+    trace_end(line);
+    return result;
+}
+
+int kiv_reg_proc(int source_module_id, const uint32_t *masks)
+{
+    if (standin_watched == 0)
+        return record_request(source_module_id, masks);
+    trace_line line;
+    int result = 0;
+    trace_begin(line, "kiv_reg_proc");
+    trace_add(line, "%d, ", source_module_id);
+    trace_masks(line, masks);
+    if (trace_fault(line, &result))
+        return result;
+    result = record_request(source_module_id, masks);
+    trace_result(line, result);
+    trace_end(line);
+    return result;
+}
+
+int kiv_reg_func(int source_module_id, int dest_module_id, const reg_masks *masks)
+{
+    if (standin_watched == 0)
+        return send_request(source_module_id, dest_module_id, masks);
+    trace_line line;
+    int result = 0;
+    uint32_t words[4] = {};
+    if (masks != nullptr)
+        memcpy(words, masks, sizeof words);
+    trace_begin(line, "kiv_reg_func");
+    trace_add(line, "%d, %d, ", source_module_id, dest_module_id);
+    trace_masks(line, masks != nullptr ? words : nullptr);
+    if (trace_fault(line, &result))
+        return result;
+    result = send_request(source_module_id, dest_module_id, masks);
+    trace_result(line, result);
+    trace_end(line);
+    return result;
+}
