@@ -1,0 +1,28 @@
+#include "core/reverser.h"
+
+#include "core/led_log.h"
+#include "kiv/socket.h"
+
+#include <cstdio>
+
+constexpr char led_log_source[] = "kiv_mirta_led";
+constexpr uint32_t reverser_event = 0x20000000; // by which the main-control module knows the LED daemon's answer
+constexpr uint16_t reverser_text_length = 4;    // every value has four digits; the terminator is not sent
+
+void kiv_led_send_common_reverser_msg(uint16_t dest_module_id, int value)
+{
+    svc_msg message = {};
+
+    message.us_cmd = MSG_CMD_SERVICE_NOTIFY;
+    message.us_dest_module_id = dest_module_id;
+    message.us_source_module_id = KIV_MODULE_LED;
+    message.ul_event_mask = reverser_event;
+    message.us_data_len = sizeof message.ul_event_mask + reverser_text_length;
+    std::snprintf(message.p_data, sizeof message.p_data, "%d", value);
+
+    if (kiv_msg_send(&message, message.us_data_len) == 0) {
+        LED_INFO("%s: send common reverser success.\n", __func__);
+    } else {
+        LED_INFO("%s: send common reverser fail.\n", __func__);
+    }
+}

@@ -1,0 +1,100 @@
+#include "policy/cpe/scenes.h"
+
+#include "core/led_log.h"
+#include "core/reverser.h"
+#include "kiv/reg.h"
+#include "policy/battery_query.h"
+#include "policy/cpe/battery.h"
+#include "policy/cpe/setters.h"
+#include "policy/cpe/state.h"
+#include "policy/mc_event.h"
+#include "policy/standard/network.h"
+
+#include <array>
+#include <cstdlib>
+
+constexpr char led_log_source[] = "kiv_mirta_led_cpe";
+
+constexpr std::array mc_event_rows = {
+    mc_event_row{REG_MC_EVENT_POWERON,       "recv REG_MC_EVENT_POWERON \n",       kiv_cpe_led_set_led_when_power_on },
+    mc_event_row{REG_MC_EVENT_SHUTTING_DOWN, "recv REG_MC_EVENT_SHUTTING_DOWN \n", kiv_cpe_led_set_led_when_power_off,
+                 REVERSER_SHUTTING_DOWN},
+    mc_event_row{REG_MC_EVENT_RESTARTING,                          "recv REG_MC_EVENT_RESTARTING \n",                                        kiv_cpe_led_set_all_leds_off               },
+    mc_event_row{REG_MC_EVENT_POWER_OFF_UNREADL,                          "recv REG_MC_EVENT_POWER_OFF_UNREADL \n",
+                 kiv_cpe_led_set_led_when_power_off_unreal},
+    mc_event_row{REG_MC_EVENT_POWER_OFF_CHARGE,                          "recv REG_MC_EVENT_POWER_OFF_CHARGE \n",
+                 kiv_cpe_led_set_led_when_power_off_charge                 },
+    mc_event_row{REG_MC_CHARGIN_STATUS,                          "recv REG_MC_CHARGIN_STATUS\n",                                          kiv_cpe_led_handle_battery_state   },
+    mc_event_row{REG_MC_BATTERY_VALUE,                          "recv REG_MC_BATTERY_VALUE\n",                                           kiv_cpe_led_handle_battery_state                   },
+};
+
+static void enter_power_state(power_state state)
+{
+    cur_cpe_power_state = state;
+    kiv_cpe_led_set_all_leds_off();
+}
+
+static void power_wifi_leds()
+{
+    // Nothing depends on whether the board has this supply.
+    [[maybe_unused]] const int result = std::system("echo 1 > /sys/class/leds/led:wifi_power_ctrl/brightness");
+}
+
+void kiv_cpe_led_handle_mc_event(uint32_t event)
+{
+    kiv_led_run_mc_event(mc_event_rows, event, led_log_source);
+}
+
+void kiv_cpe_led_set_led_when_sleep_status_change(int sleep_status)
+{
+    LED_INFO("enter kiv_led_set_led_when_sleep_status_change sleep_status=%d\n", sleep_status);
+}
+
+void kiv_led_cpe_init()
+{
+    LED_INFO("kiv_led_cpe_init!");
+    getChargerConnect();
+    kiv_cpe_led_handle_battery_state();
+    recv_nwNetType();
+    recv_nwSigStatus();
+}
+
+// Shows what is remembered, then reads it again: until the network answers that is no service.
+void kiv_cpe_led_set_led_when_power_on()
+{
+    LED_INFO("enter kiv_led_set_led_when_power_on\n");
+    cur_cpe_power_state = POWER_ON;
+    getChargerConnect();
+    kiv_cpe_led_set_bat_status(cur_cpe_battery_status, POWER_ON);
+    kiv_cpe_led_handle_battery_state();
+    kiv_cpe_set_led_sig_led_status(cur_cpe_net_type, cur_cpe_signal_state, cur_cpe_roam_status);
+    kiv_cpe_set_led_net_led_status(cur_cpe_net_type, cur_cpe_roam_status);
+    recv_nwRoamStatus();
+    recv_nwNetType();
+    recv_nwSigStatus();
+    kiv_cpe_led_set_voicemail_status(cur_cpe_voicemail_state);
+    power_wifi_leds();
+}
+
+void kiv_cpe_led_set_led_when_power_off()
+{
+    LED_INFO("enter kiv_led_set_led_when_power_off\n");
+    enter_power_state(POWER_OFF);
+}
+
+void kiv_cpe_led_set_led_when_power_off_unreal()
+{
+    LED_INFO("enter kiv_cpe_led_set_led_when_power_off_unreal\n");
+    enter_power_state(POWER_OFF_UNREAL);
+}
+
+// The battery LEDs end dark: their setter shows nothing unless the device is on. Only the power LED follows the
+// charger.
+void kiv_cpe_led_set_led_when_power_off_charge()
+{
+    LED_INFO("enter kiv_led_set_led_when_power_off_charge\n");
+    enter_power_state(POWER_OFF_CHARGE);
+    getChargerConnect();
+    kiv_led_battery_query_dispatch();
+    kiv_cpe_led_set_bat_status(cur_cpe_battery_status, POWER_OFF_CHARGE);
+}
