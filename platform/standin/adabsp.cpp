@@ -83,9 +83,10 @@ static int write_attribute(const char *folder, const char *attribute, const char
     if (fd < 0)
         return -errno;
     const auto length = static_cast<ssize_t>(strlen(text));
-    const int result = write(fd, text, static_cast<size_t>(length)) == length ? 0 : errno != 0 ? -errno : -EIO;
-    if (result == 0 && ftruncate(fd, length) != 0)
-        errno = 0;
+    const ssize_t written = write(fd, text, static_cast<size_t>(length));
+    int result = written == length ? 0 : written < 0 ? -errno : -EIO;
+    if (result == 0 && ftruncate(fd, length) != 0 && led_dir_is_ours)
+        result = -errno;
     close(fd);
     return result;
 }
@@ -178,8 +179,12 @@ static int set_led(const led_request &request)
         return -ENODEV;
     if (led_folders[request.led_id][0] == '\0')
         return -EINVAL;
-    const int found = find_led(request.led_id);
-    return found == 0 ? show(request) : found;
+    int result = find_led(request.led_id);
+    if (result == 0)
+        result = show(request);
+    if (result < 0)
+        led_max[request.led_id] = 0; // the folder may be another one next time
+    return result;
 }
 
 static void trace_request(trace_line &line, const led_request &request)

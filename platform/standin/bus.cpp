@@ -43,7 +43,7 @@ const char *standin_module_queue(int module_id)
 }
 
 // The lock is held by the open file until the process ends, also when it is killed.
-static bool take_lock(const char *file)
+static int take_lock(const char *file)
 {
     char path[NAME_MAX + 32];
     char holder[16] = "";
@@ -51,19 +51,19 @@ static bool take_lock(const char *file)
     const int fd = openat(standin_device_dir(), path, O_RDWR | O_CREAT | O_CLOEXEC | O_NOFOLLOW, 0600);
     if (fd < 0) {
         standin_error("%s: %s", path, strerror(errno));
-        return false;
+        return -1;
     }
     if (flock(fd, LOCK_EX | LOCK_NB) != 0) {
         const ssize_t length = pread(fd, holder, sizeof holder - 1, 0);
         holder[length > 0 ? length : 0] = '\0';
         standin_error("%s is already held by process %.*s", file, static_cast<int>(strcspn(holder, "\n")), holder);
         close(fd);
-        return false;
+        return -1;
     }
     const int length = snprintf(holder, sizeof holder, "%d\n", static_cast<int>(getpid()));
     if (ftruncate(fd, 0) != 0 || pwrite(fd, holder, static_cast<size_t>(length), 0) != length)
         standin_error("%s cannot be written: %s", path, strerror(errno));
-    return true;
+    return fd;
 }
 
 static bool socket_address(const char *file, sockaddr_un &address)
@@ -81,7 +81,8 @@ int standin_bind(const char *file)
         standin_error("%s: the name is too long for a socket", file);
         return -1;
     }
-    if (!take_lock(file))
+    const int lock = take_lock(file);
+    if (lock < 0)
         return -1;
     const int fd = socket(AF_UNIX, SOCK_DGRAM | SOCK_CLOEXEC, 0);
     // Whoever bound the name before us is gone: we hold the lock.
@@ -91,6 +92,7 @@ int standin_bind(const char *file)
     standin_error("%s cannot be bound: %s", file, strerror(errno));
     if (fd >= 0)
         close(fd);
+    close(lock);
     return -1;
 }
 

@@ -235,8 +235,6 @@ int standin_parse_ints(const char *text, int *values, int count)
     }
 }
 
-void trace_reload(); // trace.cpp
-
 void standin_reload()
 {
     const std::lock_guard guard(device_lock);

@@ -64,8 +64,10 @@ static size_t escape_text(const char *text, char *escaped, size_t size)
         length--;
     for (size_t at = 0; at < length && used + 5 < size; at++) {
         const auto byte = static_cast<unsigned char>(text[at]);
-        const bool is_control = byte < 0x20 || byte == 0x7f;
-        used += static_cast<size_t>(snprintf(escaped + used, size - used, is_control ? "\\x%02x" : "%c", byte));
+        if (byte < 0x20 || byte == 0x7f)
+            used += static_cast<size_t>(snprintf(escaped + used, size - used, "\\x%02x", byte));
+        else
+            escaped[used++] = text[at];
     }
     return used;
 }

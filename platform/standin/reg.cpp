@@ -6,6 +6,8 @@
 #include <array>
 #include <cstdio>
 #include <cstring>
+#include <dirent.h>
+#include <fcntl.h>
 #include <mutex>
 #include <unistd.h>
 
@@ -35,19 +37,27 @@ static bool is_module_id(int module_id)
     return module_id > 0 && module_id <= UINT16_MAX;
 }
 
+// The folder shows this process's table, which starts empty.
+static void clear_folder()
+{
+    const int fd = openat(standin_device_dir(), "reg", O_RDONLY | O_DIRECTORY | O_CLOEXEC);
+    DIR *folder = fd < 0 ? nullptr : fdopendir(fd);
+    if (folder == nullptr)
+        return;
+    for (const dirent *entry = readdir(folder); entry != nullptr; entry = readdir(folder)) {
+        if (standin_is_plain_name(entry->d_name))
+            unlinkat(fd, entry->d_name, 0);
+    }
+    closedir(folder);
+}
+
 static int init_table(int module_id)
 {
     if (!is_module_id(module_id) || standin_device_dir() < 0)
         return -1;
     const std::lock_guard guard(table_lock);
-    // The folder shows this process's table, which starts empty.
-    for (registration &row : table) {
-        char path[32];
-        snprintf(path, sizeof path, "reg/%d", row.module_id);
-        if (row.module_id != 0)
-            unlinkat(standin_device_dir(), path, 0);
-        row = {};
-    }
+    clear_folder();
+    table = {};
     table_ready = true;
     return 0;
 }

@@ -61,6 +61,8 @@ struct trace_line {
     char text[8704];
 };
 
+void trace_reload(); // reads KIV_TRACE and KIV_FAULTS
+
 void trace_begin(trace_line &line, const char *call);
 __attribute__((format(printf, 2, 3))) void trace_add(trace_line &line, const char *format, ...);
 void trace_text(trace_line &line, const char *text);                          // in quotes, with C escapes

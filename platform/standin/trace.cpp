@@ -33,8 +33,6 @@ int standin_open_sink(const char *variable, const char *path)
     return fd;
 }
 
-void trace_reload();
-
 void trace_reload()
 {
     const char *path = getenv("KIV_TRACE");
@@ -120,7 +118,10 @@ static const char *escape(unsigned char byte, char *room, size_t size)
     case '\\':
         return "\\\\";
     default:
-        snprintf(room, size, byte >= 0x20 && byte < 0x7f ? "%c" : "\\x%02x", byte);
+        room[0] = static_cast<char>(byte);
+        room[1] = '\0';
+        if (byte < 0x20 || byte >= 0x7f)
+            snprintf(room, size, "\\x%02x", byte);
         return room;
     }
 }
@@ -134,7 +135,9 @@ void trace_text_of(trace_line &line, const char *text, size_t size)
     trace_add(line, "\"");
     for (size_t at = 0; at < size && text[at] != '\0' && line.length + 8 < line.limit; at++) {
         char room[8];
-        trace_add(line, "%s", escape(static_cast<unsigned char>(text[at]), room, sizeof room));
+        const char *shown = escape(static_cast<unsigned char>(text[at]), room, sizeof room);
+        while (*shown != '\0')
+            line.text[line.length++] = *shown++;
     }
     trace_add(line, "\"");
 }
