@@ -36,7 +36,7 @@ struct size_unit_row {
 };
 
 // Any other code, or none: the size is in bytes.
-constexpr std::array size_unit_rows = {
+constexpr auto size_unit_rows = std::array{
     size_unit_row{1,       bytes_per_kib *bytes_per_kib                              },
     size_unit_row{1024,    bytes_per_kib *bytes_per_kib *bytes_per_kib               },
     size_unit_row{1048576, bytes_per_kib *bytes_per_kib *bytes_per_kib *bytes_per_kib},

@@ -17,7 +17,7 @@ struct product_type_row {
 };
 
 // Any other text leaves the product as it is.
-constexpr std::array product_type_rows = {
+constexpr auto product_type_rows = std::array{
     product_type_row{"ONLY_DATA_CARD",      LED_PRODUCT_DATA_CARD   },
     product_type_row{"NO_DRIVER_DATA_CARD", LED_PRODUCT_DATA_CARD   },
     product_type_row{"DRIVER_DATA_CARD",    LED_PRODUCT_DATA_CARD   },

@@ -128,7 +128,7 @@ struct source_row {
     void (*any_event)(uint32_t); // nullptr: the events are in notification_rows
 };
 
-constexpr std::array source_rows = {
+constexpr auto source_rows = std::array{
     source_row{KIV_MODULE_MAIN,   "[info] source msg KIV_MODULE_MAIN\n",   kiv_led_mc_event_dispatch},
     source_row{KIV_MODULE_MDM,    "[info] source msg KIV_MODULE_MDM\n",    nullptr                  },
     source_row{KIV_MODULE_NWINFO, "[info] source msg KIV_MODULE_NWINFO\n", nullptr                  },
@@ -149,7 +149,7 @@ struct notification_row {
     const char *guarded = nullptr; // dropped under this name unless on and awake
 };
 
-constexpr std::array notification_rows = {
+constexpr auto notification_rows = std::array{
     notification_row{KIV_MODULE_MDM,                REG_SIM_STATUS,            "recv REG_SIM_STATUS\n",              false,                                                   on_sim                                                                                                      },
     notification_row{KIV_MODULE_NWINFO,             REG_NWINFO_ROAMING_STATUS, "recv  REG_NWINFO_ROAMING_STATUS \n", false,
                      on_roaming                                                                                                                                                                                                                                                           },

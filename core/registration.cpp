@@ -24,25 +24,25 @@ constexpr uint32_t mc_quick_events =
 constexpr uint32_t wlan_and_wps_events = REG_WLAN_CURRENT_STATUS | REG_WLAN_AP_WPS_STATE | REG_WLAN_AP_WPS_STATE_CHIP2;
 constexpr uint32_t wlan_event_4 = 0x4; // registered on the handheld, shown by nothing
 
-constexpr std::array common_registrations = {
+constexpr auto common_registrations = std::array{
     registration{KIV_MODULE_MDM,    REG_SIM_STATUS                                                     },
     registration{KIV_MODULE_NWINFO, REG_NWINFO_SIG_BAR | REG_NWINFO_ROAMING_STATUS | REG_NWINFO_NETTYPE},
     registration{KIV_MODULE_PPP,    REG_PPP_STATUS | REG_Q6_PPP_STATUS                                 },
 };
-constexpr std::array ufi_registrations = {
+constexpr auto ufi_registrations = std::array{
     registration{KIV_MODULE_DST,  REG_DST_FLOW_STATUS                                                      },
     registration{KIV_MODULE_WLAN, REG_WLAN_CURRENT_STATUS | wlan_event_4                                   },
     registration{KIV_MODULE_SMS,  REG_WMS_SMS_NV_UNREAD_SMS | REG_WMS_SMS_NEW_SMS | REG_WMS_SMS_MEMORY_FULL},
 };
-constexpr std::array paper_kite_registrations = {
+constexpr auto paper_kite_registrations = std::array{
     registration{KIV_MODULE_WLAN, wlan_and_wps_events},
 };
-constexpr std::array module_registrations = {
+constexpr auto module_registrations = std::array{
     registration{KIV_MODULE_SMS,   REG_WMS_SMS_VOCEMAIL_SET_FLAG, "reg SMS notify msg begin!",         "reg SMS notify msg end!"},
     registration{KIV_MODULE_VOICE, REG_VOICE_PHONE_LED_STATE,     "reg voice phone notify msg begin!",
                  "reg voice phone notify msg end!"                                                                              },
 };
-constexpr std::array uni_core_cpe_registrations = {
+constexpr auto uni_core_cpe_registrations = std::array{
     registration{KIV_MODULE_WLAN,            wlan_and_wps_events          },
     registration{ KIV_MODULE_VOICE, REG_VOICE_PHONE_LED_STATE, "reg voice phone notify msg!"},
 };

@@ -21,7 +21,7 @@ struct tr181_led {
     char location[32];
 };
 
-constexpr std::array tr181_leds = {
+constexpr auto tr181_leds = std::array{
     tr181_led{"cpe-power",    "InUse",      "Front"},
     tr181_led{"cpe-wifi",     "InUse",      "Front"},
     tr181_led{"cpe-phone",    "InUse",      "Front"},

@@ -25,49 +25,49 @@ struct led_group {
     const char *fail_text = nullptr; // followed by the board's result; without it the line names the LED
 };
 
-constexpr std::array sig_leds = {
+constexpr auto sig_leds = std::array{
     off_row{LED_SIG_BLUE, "set sig blue off fail:"}
 };
-constexpr std::array net_leds = {
+constexpr auto net_leds = std::array{
     off_row{LED_NET_RED,   "set net red off fail:"  },
     off_row{LED_NET_BLUE,  "set net blue off fail:" },
     off_row{LED_NET_WHITE, "set net white off fail:"},
 };
-constexpr std::array rssi_leds = {
+constexpr auto rssi_leds = std::array{
     off_row{LED_RSSI_RED,    "set rssi red off fail: "  },
     off_row{LED_RSSI_GREEN,  "set rssi green off fail:" },
     off_row{LED_RSSI_BLUE,   "set rssi blue off fail:"  },
     off_row{LED_RSSI_YELLOW, "set rssi yellow off fail:"},
 };
-constexpr std::array power_leds = {
+constexpr auto power_leds = std::array{
     off_row{LED_POWER_BLUE, "set power blue off fail:"}
 };
-constexpr std::array bat_leds = {
+constexpr auto bat_leds = std::array{
     off_row{LED_BAT_RED,    "set bat red off fail: "  },
     off_row{LED_BAT_GREEN,  "set bat green off fail:" },
     off_row{LED_BAT_BLUE,   "set bat blue off fail:"  },
     off_row{LED_BAT_YELLOW, "set bat yellow off fail:"},
 };
-constexpr std::array wifi_leds = {
+constexpr auto wifi_leds = std::array{
     off_row{LED_WIFI_BLUE, "set wifi blue off fail:"}
 };
-constexpr std::array sms_leds = {
+constexpr auto sms_leds = std::array{
     off_row{LED_SMS_GREEN, "set sms green off fail:"},
     off_row{LED_SMS_BLUE,  "set sms blue off fail:" },
 };
-constexpr std::array flow_leds = {
+constexpr auto flow_leds = std::array{
     off_row{LED_FLOW_RED,    "set flow red off fail: "  },
     off_row{LED_FLOW_YELLOW, "set flow yellow off fail:"},
     off_row{LED_FLOW_GREEN,  "set flow green off fail:" },
     off_row{LED_FLOW_BLUE,   "set flow blue off fail:"  },
 };
-constexpr std::array voicemail_leds = {
+constexpr auto voicemail_leds = std::array{
     off_row{LED_VOICEMAIL_RED,    "set voicemail red off fail: "  },
     off_row{LED_VOICEMAIL_GREEN,  "set voicemail green off fail:" },
     off_row{LED_VOICEMAIL_BLUE,   "set voicemail blue off fail:"  },
     off_row{LED_VOICEMAIL_YELLOW, "set voicemail yellow off fail:"},
 };
-constexpr std::array voice_leds = {
+constexpr auto voice_leds = std::array{
     off_row{LED_VOICE_RED,    "set voice red off fail: "  },
     off_row{LED_VOICE_GREEN,  "set voice green off fail:" },
     off_row{LED_VOICE_BLUE,   "set voice blue off fail:"  },

@@ -19,7 +19,7 @@ struct level_row {
     cpe_battery_status charging;
 };
 
-constexpr std::array level_rows = {
+constexpr auto level_rows = std::array{
     level_row{20,      CPE_BAT_LOW,    CPE_BAT_CHARGING_LOW   },
     level_row{50,      CPE_BAT_MIDDLE, CPE_BAT_CHARGING_MIDDLE},
     level_row{INT_MAX, CPE_BAT_HIGH,   CPE_BAT_CHARGING_HIGH  },

@@ -15,7 +15,7 @@
 
 constexpr char led_log_source[] = "kiv_mirta_led_cpe";
 
-constexpr std::array mc_event_rows = {
+constexpr auto mc_event_rows = std::array{
     mc_event_row{REG_MC_EVENT_POWERON,       "recv REG_MC_EVENT_POWERON \n",       kiv_cpe_led_set_led_when_power_on },
     mc_event_row{REG_MC_EVENT_SHUTTING_DOWN, "recv REG_MC_EVENT_SHUTTING_DOWN \n", kiv_cpe_led_set_led_when_power_off,
                  REVERSER_SHUTTING_DOWN},

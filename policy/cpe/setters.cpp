@@ -16,7 +16,7 @@ struct net_row {
     led_step roaming;
 };
 
-constexpr std::array net_rows = {
+constexpr auto net_rows = std::array{
     net_row{NET_NO_SERVICE, {LED_NET_RED, LED_OP_ON, 0, 0, 1}, {LED_NET_RED, LED_OP_ON, 0, 0, 1}        },
     net_row{NET_2G,         {LED_NET_16, LED_OP_ON, 0, 0, 1},  {LED_NET_16, LED_OP_BLINK, 1000, 1000, 1}},
     net_row{NET_3G,         {LED_NET_16, LED_OP_ON, 0, 0, 1},  {LED_NET_16, LED_OP_BLINK, 1000, 1000, 1}},
@@ -28,7 +28,7 @@ constexpr led_step weak_step = {LED_VOICE_YELLOW, LED_OP_ON, 0, 0, 1};
 constexpr led_step strong_step = {LED_VOICE_GREEN, LED_OP_ON, 0, 0, 1};
 
 // By signal bars.
-constexpr std::array signal_steps = {weak_step, weak_step, weak_step, strong_step, strong_step, strong_step};
+constexpr auto signal_steps = std::array{weak_step, weak_step, weak_step, strong_step, strong_step, strong_step};
 
 struct battery_row {
     int status;
@@ -36,7 +36,7 @@ struct battery_row {
 };
 
 // The two statuses without a row here switch the group off.
-constexpr std::array battery_rows = {
+constexpr auto battery_rows = std::array{
     battery_row{CPE_BAT_HIGH,            {LED_BAT_GREEN, LED_OP_ON, 0, 0, 1}          },
     battery_row{CPE_BAT_MIDDLE,          {LED_BAT_YELLOW, LED_OP_ON, 0, 0, 1}         },
     battery_row{CPE_BAT_LOW,             {LED_BAT_RED, LED_OP_ON, 0, 0, 1}            },
@@ -46,7 +46,7 @@ constexpr std::array battery_rows = {
 };
 
 // By phone state.
-constexpr std::array voice_steps = {
+constexpr auto voice_steps = std::array{
     led_step{LED_VOICE_BLUE, LED_OP_OFF,   0,    0,    0},
     led_step{LED_VOICE_BLUE, LED_OP_ON,    0,    0,    4},
     led_step{LED_VOICE_BLUE, LED_OP_BLINK, 1000, 1000, 4},

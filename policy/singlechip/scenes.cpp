@@ -18,7 +18,7 @@
 constexpr char led_log_source[] = "kiv_mirta_led";
 constexpr int sleep_status_asleep = 5; // on this product 1 is a wake-up
 
-constexpr std::array mc_event_rows = {
+constexpr auto mc_event_rows = std::array{
     mc_event_row{REG_MC_EVENT_POWERON,                      "recv REG_MC_EVENT_POWERON \n",       kiv_singelchip_led_set_led_when_power_on            },
     mc_event_row{REG_MC_EVENT_SHUTTING_DOWN,                "recv REG_MC_EVENT_SHUTTING_DOWN \n",
                  kiv_singelchip_led_set_led_when_power_off,                                                                                             REVERSER_SHUTTING_DOWN},
@@ -32,7 +32,7 @@ constexpr std::array mc_event_rows = {
     mc_event_row{REG_MC_BATTERY_VALUE,                                  "recv REG_MC_BATTERY_VALUE\n",                                     nullptr                                                                                                                                                                         },
 };
 
-constexpr std::array white_steps = {
+constexpr auto white_steps = std::array{
     led_step{LED_WIFI_BLUE, LED_OP_ON, 0, 0, 2},
     led_step{LED_NET_WHITE, LED_OP_ON, 0, 0, 2},
     led_step{LED_SIG_BLUE,  LED_OP_ON, 0, 0, 3},

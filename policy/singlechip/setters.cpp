@@ -11,7 +11,7 @@ constexpr char led_log_source[] = "kiv_mirta_led_set_status_singlechip";
 constexpr led_step signal_lit = {LED_SIG_6, LED_OP_ON, 0, 0, 4};
 
 // By signal state.
-constexpr std::array signal_steps = {
+constexpr auto signal_steps = std::array{
     led_step{LED_SIG_6, LED_OP_OFF,   0,   0,    0},
     led_step{LED_SIG_6, LED_OP_BLINK, 800, 1200, 4},
     signal_lit,
@@ -20,7 +20,7 @@ constexpr std::array signal_steps = {
     signal_lit,
 };
 // By phone state.
-constexpr std::array voice_steps = {
+constexpr auto voice_steps = std::array{
     led_step{LED_VOICE_BLUE, LED_OP_OFF,   0,   0,    0},
     led_step{LED_VOICE_BLUE, LED_OP_ON,    0,   0,    4},
     led_step{LED_VOICE_BLUE, LED_OP_BLINK, 400, 1600, 4},

@@ -19,7 +19,7 @@ struct charge_row {
     led_step step;
 };
 
-constexpr std::array charge_rows = {
+constexpr auto charge_rows = std::array{
     charge_row{12,      "power red blink,power_percent=", {LED_BAT_RED, LED_OP_BLINK, 800, 1200, 4}},
     charge_row{23,      "power red on,power_percent=",    {LED_BAT_RED, LED_OP_ON, 0, 0, 4}        },
     charge_row{INT_MAX, "power green on,power_percent=",  {LED_BAT_GREEN, LED_OP_ON, 0, 0, 4}      },

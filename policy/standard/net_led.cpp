@@ -14,7 +14,7 @@ struct net_led_row {
     led_step step;
 };
 
-constexpr std::array net_led_rows = {
+constexpr auto net_led_rows = std::array{
     net_led_row{NET_NO_SERVICE, {LED_NET_RED, LED_OP_ON, 0, 0, 2}  },
     net_led_row{NET_2G,         {LED_NET_BLUE, LED_OP_ON, 0, 0, 2} },
     net_led_row{NET_3G,         {LED_NET_BLUE, LED_OP_ON, 0, 0, 2} },

@@ -19,7 +19,7 @@ struct net_type_row {
 };
 
 // Every other text, the empty one among them, is limited or no service.
-constexpr std::array net_type_rows = {
+constexpr auto net_type_rows = std::array{
     net_type_row{"GSM",        NET_2G},
     net_type_row{"GPRS",       NET_2G},
     net_type_row{"EDGE",       NET_2G},

@@ -27,13 +27,13 @@ constexpr int rolling_leds_polls = 100;
 constexpr int initial_flash_ms = 200;
 constexpr int us_per_ms = 1000;
 
-constexpr std::array all_on_steps = {
+constexpr auto all_on_steps = std::array{
     led_step{LED_BAT_GREEN, LED_OP_ON, 0, 0, 4},
     led_step{LED_ID_41,     LED_OP_ON, 0, 0, 4},
     led_step{LED_SMS_BLUE,  LED_OP_ON, 0, 0, 4},
     led_step{LED_NET_RED,   LED_OP_ON, 0, 0, 4},
 };
-constexpr std::array flash_steps = {
+constexpr auto flash_steps = std::array{
     led_step{LED_BAT_GREEN, LED_OP_OFF, 0, 0, 0},
     led_step{LED_BAT_RED,   LED_OP_ON,  0, 0, 4},
     led_step{LED_ID_41,     LED_OP_ON,  0, 0, 4},
@@ -41,13 +41,13 @@ constexpr std::array flash_steps = {
     led_step{LED_NET_14,    LED_OP_ON,  0, 0, 4},
 };
 // The red battery LED stays lit.
-constexpr std::array flash_end_steps = {
+constexpr auto flash_end_steps = std::array{
     led_step{LED_ID_41,    LED_OP_OFF, 0, 0, 0},
     led_step{LED_SMS_BLUE, LED_OP_OFF, 0, 0, 0},
     led_step{LED_NET_14,   LED_OP_OFF, 0, 0, 0},
 };
 
-constexpr std::array mc_event_rows = {
+constexpr auto mc_event_rows = std::array{
     mc_event_row{REG_MC_EVENT_POWERON,                          "recv REG_MC_EVENT_POWERON \n",       kiv_led_set_led_when_power_on          },
     mc_event_row{REG_MC_EVENT_SHUTTING_DOWN,                    "recv REG_MC_EVENT_SHUTTING_DOWN \n", kiv_led_set_led_when_power_off,
                  REVERSER_SHUTTING_DOWN},

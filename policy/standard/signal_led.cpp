@@ -25,7 +25,7 @@ struct signal_led_row {
     led_step step;
 };
 
-constexpr std::array signal_led_rows = {
+constexpr auto signal_led_rows = std::array{
     signal_led_row{SIGNAL_LED_DARK,  {LED_SIG_6, LED_OP_OFF, 0, 0, 0}       },
     signal_led_row{SIGNAL_LED_BLINK, {LED_SIG_6, LED_OP_BLINK, 200, 1400, 4}},
     signal_led_row{SIGNAL_LED_LIT,   {LED_SIG_6, LED_OP_ON, 0, 0, 4}        },

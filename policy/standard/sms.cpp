@@ -15,7 +15,7 @@ constexpr char led_log_source[] = "kiv_mirta_led";
 constexpr int new_sms_period_ms = 10000;
 
 // By sms_state.
-constexpr std::array sms_steps = {
+constexpr auto sms_steps = std::array{
     led_step{LED_SMS_BLUE, LED_OP_OFF,   0,   0,    0},
     led_step{LED_SMS_BLUE, LED_OP_ON,    0,   0,    4},
     led_step{LED_SMS_BLUE, LED_OP_BLINK, 800, 1200, 4},
