@@ -31,7 +31,7 @@ TEST_F(faults, FirstMatchingLineDecides)
         {"bat_green -5\n",                  "0f0f0f"},
         {"'bat_red off' -5 1\n",            "f00000"},
         {"'bat_red on' -5\n",               "000000"},
-        {"bat_red -5 1\nbat_green -5 1\n",  "ff0000"},
+        {"bat_red -5 2\nbat_green -5 2\n",  "ffff00"},
         {"bat_green 0\n* -5\n",             "f0f0f0"}, // made to succeed without being carried out
         {"# comment\n\n  bat_red -5\n",     "f0f0f0"},
         {"nonsense\n* -5x\n* -5 -1\n* \n'", "000000"},
