@@ -22,4 +22,11 @@ bool split_pair(statement_words &in, const word &pair, std::string &key, std::st
 bool is_key(std::string_view text); // may name a file
 
 bool parse_statement(const std::vector<word> &words, statement &out, std::string &error);
+// The statements that become a message to the daemon.
+bool parse_register(statement_words &in, statement &out);
+bool parse_notify(statement_words &in, statement &out);
+bool parse_command(statement_words &in, statement &out);
+bool parse_raw(statement_words &in, statement &out);
+bool parse_indication(statement_words &in, statement &out);
+
 bool parse_expectation(statement_words &in, expectation &wanted);

@@ -14,6 +14,7 @@ constexpr int64_t DAY_S = 86400;
 constexpr int64_t LAST_WALL_S = 2'145'916'800; // the end of 2037, as far as a 32-bit clock shows every day
 constexpr int64_t LONGEST_RUN_NS = 10'000 * DAY_S * NS_PER_S;
 constexpr int RETRIES_IN_REAL_TIME = 20;
+constexpr int64_t REAL_MOMENT_US = 20'000;
 constexpr size_t ERROR_LINES = 60;
 
 struct playing {
@@ -262,7 +263,9 @@ play_report play(const scenario &story, const play_options &options)
     playing p = {.story = story, .device = {}, .report = {}};
     std::string error;
     rig &r = p.device;
-    r.line = {.out = options.timeline, .every_request = options.every_request};
+    r.line.out = options.timeline;
+    r.line.every_request = options.every_request;
+    r.line.moment_length_us = options.process.real_time ? REAL_MOMENT_US : 0;
     if (!set_up_rig(r, options.process, options.trace_path, error)) {
         p.report = {.result = PLAY_IMPOSSIBLE, .failure = error + "\n"};
     } else if (play_all(p, story.statements) && !story.statements.empty()) {

@@ -24,7 +24,7 @@ void timeline_stimulus(timeline &line, int64_t now_us, const std::string &text)
 
 void timeline_entry(timeline &line, const observed &state, const trace_entry &entry)
 {
-    if (entry.time_us != line.moment_us) {
+    if (entry.time_us - line.moment_us > line.moment_length_us) {
         timeline_flush(line, state);
         line.moment_us = entry.time_us;
     }

@@ -8,8 +8,9 @@
 struct timeline {
     FILE *out = nullptr; // null: nothing is printed
     bool every_request = false;
-    int64_t stimulus_us = 0; // LED changes of that moment carry no time of their own
-    int64_t moment_us = -1;  // of the changes that are being gathered
+    int64_t stimulus_us = 0;      // LED changes of that moment carry no time of their own
+    int64_t moment_us = -1;       // of the changes that are being gathered
+    int64_t moment_length_us = 0; // how far apart they may be; not at all in virtual time
     std::array<led_look, LED_ID_COUNT> before = {};
 };
 
