@@ -68,15 +68,17 @@ struct raw_field {
 
 bool parse_raw_fields(statement_words &in, statement &out)
 {
-    int64_t cmd = 0, dest = 0, source = 0, event = 0, len = 0, cut = -1;
+    int64_t cmd = 0, dest = 0, source = 0, event = 0, len = 0, times = 1, cut = -1;
     const std::array fields = {
         raw_field{"cmd",    0xffff,        &cmd   },
         raw_field{"dest",   0xffff,        &dest  },
         raw_field{"source", 0xffff,        &source},
         raw_field{"event",  0xffffffff,    &event },
         raw_field{"len",    0xffff,        &len   },
+        raw_field{"times",  MAX_RAW_BYTES, &times },
         raw_field{"cut",    MAX_RAW_BYTES, &cut   }
     };
+    std::string piece;
     std::string payload;
     while (const word *pair = take(in)) {
         std::string key;
@@ -84,7 +86,7 @@ bool parse_raw_fields(statement_words &in, statement &out)
         if (!split_pair(in, *pair, key, value))
             return false;
         if (key == "text") {
-            payload = value;
+            piece = value;
             continue;
         }
         bool known = false;
@@ -98,8 +100,11 @@ bool parse_raw_fields(statement_words &in, statement &out)
             known = true;
         }
         if (!known)
-            return fail(in, "unknown field '" + key + "'; fields are cmd, dest, source, event, len, text and cut");
+            return fail(in,
+                        "unknown field '" + key + "'; fields are cmd, dest, source, event, len, text, times and cut");
     }
+    for (; times > 0 && payload.size() <= MAX_RAW_BYTES; times--)
+        payload += piece;
     out.bytes = message_bytes({static_cast<uint16_t>(cmd), static_cast<uint16_t>(dest), static_cast<uint16_t>(source),
                                static_cast<uint16_t>(len), static_cast<uint32_t>(event)},
                               payload);
@@ -173,7 +178,8 @@ bool parse_raw(statement_words &in, statement &out)
 {
     out.what = verb::SEND;
     if (at_end(in))
-        return fail(in, "raw BYTES, raw length N fill BYTE, or raw cmd=N dest=N source=N event=N len=N text=\"...\"");
+        return fail(in, "raw BYTES, raw length N fill BYTE, or raw cmd=N dest=N source=N event=N len=N "
+                        "text=\"...\" times=N cut=N");
     const bool fields = in.words[in.next].sign.has_value();
     const bool parsed = take_keyword(in, "length") ? parse_raw_length(in, out)
                         : fields                   ? parse_raw_fields(in, out)
