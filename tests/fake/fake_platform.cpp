@@ -1,0 +1,402 @@
+#include "fake_platform.h"
+
+#include "kiv/cfg.h"
+#include "kiv/ipc.h"
+#include "kiv/led.h"
+#include "kiv/log.h"
+#include "kiv/mem.h"
+#include "kiv/nv.h"
+#include "kiv/reg.h"
+#include "kiv/socket.h"
+#include "kiv/tr181.h"
+
+#include <algorithm>
+#include <atomic>
+#include <cstdarg>
+#include <cstdio>
+#include <cstring>
+#include <mutex>
+#include <string_view>
+#include <utility>
+
+constexpr size_t longest_record = 5000;
+constexpr size_t most_timers = 64;
+constexpr size_t long_run = 20; // from here on a run of one character is shown as x{20}
+
+static fake_device device;
+static std::mutex device_mutex; // also held by the record; never while a timer's procedure runs
+static std::string record;
+static size_t recorded_lines;
+static std::atomic<bool> recording;
+static std::atomic<unsigned long> led_requests;
+static int last_timer;
+
+static std::string quoted(std::string_view text)
+{
+    std::string shown = "\"";
+    for (size_t i = 0; i < text.size();) {
+        const size_t end = std::min(text.find_first_not_of(text[i], i), text.size());
+        const unsigned char c = static_cast<unsigned char>(text[i]);
+        char one[8];
+        std::snprintf(one, sizeof one, c == '\n' ? "\\n" : c < ' ' || c > '~' ? "\\x%02x" : "%c", c);
+        if (end - i >= long_run) {
+            shown += one + ("{" + std::to_string(end - i) + "}");
+            i = end;
+        } else {
+            shown += one;
+            ++i;
+        }
+    }
+    return shown + "\"";
+}
+
+__attribute__((format(printf, 1, 2))) static void say(const char *format, ...)
+{
+    if (!recording) {
+        return;
+    }
+    char line[2048];
+    va_list arguments;
+    va_start(arguments, format);
+    std::vsnprintf(line, sizeof line, format, arguments);
+    va_end(arguments);
+    fake_note(line);
+}
+
+// The bytes that are not zero, by offset: whatever else a message should hold shows up here.
+static std::string dump(const void *data, size_t size)
+{
+    const char *bytes = static_cast<const char *>(data);
+    std::string shown;
+    if (!recording) {
+        return shown;
+    }
+    for (size_t i = 0; i < size; ++i) {
+        if (bytes[i] == 0) {
+            continue;
+        }
+        const std::string_view run(bytes + i, strnlen(bytes + i, size - i));
+        shown += " " + std::to_string(i) + ":" + quoted(run);
+        i += run.size();
+    }
+    return shown;
+}
+
+fake_device &fake_platform()
+{
+    return device;
+}
+
+void fake_record(bool on)
+{
+    recording = on;
+}
+
+void fake_note(const std::string &line)
+{
+    if (!recording) {
+        return;
+    }
+    const std::lock_guard lock(device_mutex);
+    if (++recorded_lines <= longest_record) {
+        record += line + "\n";
+    }
+}
+
+std::string fake_take_record()
+{
+    const std::lock_guard lock(device_mutex);
+    recorded_lines = 0;
+    return std::exchange(record, {});
+}
+
+bool fake_fire(int handle)
+{
+    std::unique_lock lock(device_mutex);
+    const auto found = device.timers.find(handle);
+    if (found == device.timers.end()) {
+        return false;
+    }
+    const fake_timer timer = found->second;
+    if (!timer.repeats) {
+        device.timers.erase(found);
+    }
+    lock.unlock();
+    timer.callback(timer.argument);
+    return true;
+}
+
+void fake_set_nv(const std::string &key, const std::string &value)
+{
+    const std::lock_guard lock(device_mutex);
+    device.nv[key] = value;
+}
+
+void fake_deliver(std::string message)
+{
+    const std::lock_guard lock(device_mutex);
+    device.inbox.emplace_back(std::move(message));
+}
+
+std::map<int, fake_timer> fake_timers()
+{
+    const std::lock_guard lock(device_mutex);
+    return device.timers;
+}
+
+unsigned long fake_led_requests()
+{
+    return led_requests;
+}
+
+void kiv_syslog_append(int level, const char *file, int, int log_id, const char *format, ...)
+{
+    char text[1400]; // formatted also while nothing is recorded, so that a sanitizer sees what is read
+    va_list arguments;
+    va_start(arguments, format);
+    std::vsnprintf(text, sizeof text, format, arguments);
+    va_end(arguments);
+    if (!recording) {
+        return;
+    }
+    const std::string foreign_id = log_id == 31 ? "" : "/" + std::to_string(log_id);
+    say("log %d%s %s %s", level, foreign_id.c_str(), file, quoted(text).c_str());
+}
+
+int kiv_init_msg(const char *queue_name, int *handle)
+{
+    say("queue %s", queue_name);
+    const std::lock_guard lock(device_mutex);
+    if (device.failing_queue_opens > 0) {
+        --device.failing_queue_opens;
+        return -2;
+    }
+    *handle = 7;
+    return 0;
+}
+
+int kiv_send_msg(const char *queue_name, const void *data, int length)
+{
+    say("send %s %d%s", queue_name, length, dump(data, static_cast<size_t>(length)).c_str());
+    return device.send_result;
+}
+
+int kiv_recv_msg(int handle, void *buffer, int size)
+{
+    say("recv %d %d", handle, size);
+    const std::lock_guard lock(device_mutex);
+    if (device.inbox.empty()) {
+        return -1;
+    }
+    const std::optional<std::string> message = std::move(device.inbox.front());
+    device.inbox.pop_front();
+    if (!message) {
+        return -1;
+    }
+    const size_t length = std::min(message->size(), static_cast<size_t>(size));
+    std::memcpy(buffer, message->data(), length);
+    return static_cast<int>(length);
+}
+
+int kiv_msg_send(const svc_msg *message, int data_len)
+{
+    say("send %d %d%s", message->us_dest_module_id, data_len, dump(message, sizeof *message).c_str());
+    return device.send_result;
+}
+
+void kiv_mem_set(void *dest, int value, size_t size)
+{
+    say("mem_set %d %zu", value, size);
+    std::memset(dest, value, size);
+}
+
+void kiv_mem_cpy(void *dest, const void *src, size_t size)
+{
+    say("mem_cpy %zu", size);
+    std::memcpy(dest, src, size);
+}
+
+int kiv_reg_table_init(int module_id)
+{
+    say("reg_table %d", module_id);
+    return 0;
+}
+
+int kiv_reg_proc(int source_module_id, const uint32_t *masks)
+{
+    say("reg_proc %d %x %x %x %x", source_module_id, masks[0], masks[1], masks[2], masks[3]);
+    return device.reg_proc_result;
+}
+
+int kiv_reg_func(int source_module_id, int dest_module_id, const reg_masks *masks)
+{
+    say("reg %d %d %x %x %x %x", source_module_id, dest_module_id, masks->mask1, masks->mask2, masks->mask3,
+        masks->mask4);
+    return -1; // the daemon ignores it
+}
+
+int kiv_cfg_get_item(int item, void *buffer, int size)
+{
+    say("cfg %d %d", item, size);
+    const auto found = device.cfg.find(item);
+    if (found == device.cfg.end()) {
+        return -1;
+    }
+    std::memcpy(buffer, found->second.data(), std::min(found->second.size(), static_cast<size_t>(size)));
+    return 0;
+}
+
+int kiv_nvconfig_read(const char *key, char *buffer, int size)
+{
+    say("nv %s %d", key, size);
+    const std::lock_guard lock(device_mutex);
+    const auto found = device.nv.find(key);
+    if (found == device.nv.end()) {
+        return -1;
+    }
+    std::snprintf(buffer, static_cast<size_t>(size), "%s", found->second.c_str());
+    return 0;
+}
+
+int kiv_nvconfig_write(const char *key, const char *value, int length)
+{
+    say("nv write %s \"%s\" %d", key, value, length);
+    fake_set_nv(key, std::string(value, static_cast<size_t>(length)));
+    return -1; // the daemon ignores it
+}
+
+int kiv_ipc_init(int log_id, int flag)
+{
+    say("ipc %d %d", log_id, flag);
+    return 0;
+}
+
+int kiv_timer(void (*callback)(void *), void *argument, int period_ms, int repeat)
+{
+    std::unique_lock lock(device_mutex);
+    int handle = 0;
+    if (device.failing_timers > 0) {
+        --device.failing_timers;
+    } else {
+        handle = ++last_timer;
+        device.timers[handle] = {callback, argument, repeat != 0};
+        if (device.timers.size() > most_timers) {
+            device.timers.erase(device.timers.begin());
+        }
+    }
+    lock.unlock();
+    say("timer %d %s \"%s\" = %d", period_ms, repeat != 0 ? "repeat" : "once", static_cast<const char *>(argument),
+        handle);
+    return handle;
+}
+
+int kiv_delete_timer(int handle)
+{
+    say("delete %d", handle);
+    const std::lock_guard lock(device_mutex);
+    device.timers.erase(handle);
+    return -1; // the daemon ignores it
+}
+
+// All five fields: what is not shown is 0.
+static void note_request(const led_request &request)
+{
+    static constexpr std::array<const char *, 3> names = {"on", "off", "blink"};
+    const size_t operation = static_cast<size_t>(request.led_operation);
+    char line[80];
+    int length = std::snprintf(line, sizeof line, "led %d %s", request.led_id, names.at(operation));
+    const bool blinks = request.blink_time1 != 0 || request.blink_time2 != 0;
+    if (blinks) {
+        length += std::sprintf(line + length, " %d/%d", request.blink_time1, request.blink_time2);
+    }
+    if (operation != LED_OP_OFF || request.brightness != 0 || blinks) {
+        std::sprintf(line + length, " %d", request.brightness);
+    }
+    fake_note(line);
+}
+
+int kiv_bsp_set_leds_sync(led_request request, int *result)
+{
+    if (recording) {
+        note_request(request);
+    }
+    ++led_requests;
+    const auto found = device.led_results.find(request.led_id);
+    *result = found == device.led_results.end() ? 0 : found->second;
+    return -1; // the daemon ignores it
+}
+
+static int answer(const char *query, const std::optional<bsp_query_result> &scripted, bsp_query_result *result)
+{
+    say("%s %d %d", query, result->ret, result->data);
+    if (!scripted) {
+        return -1;
+    }
+    *result = *scripted;
+    return 0;
+}
+
+int kiv_bsp_get_charger_connect_status_sync(bsp_query_result *result)
+{
+    return answer("charger", device.charger, result);
+}
+
+int kiv_bsp_get_battery_online_status_sync(bsp_query_result *result)
+{
+    return answer("battery", device.battery, result);
+}
+
+int kiv_bsp_get_sensor_temp_sync(int sensor_id, bsp_sensor_temp *temp)
+{
+    say("sensor %d", sensor_id);
+    const std::optional<int> scripted = device.sensors.at(static_cast<size_t>(sensor_id));
+    if (!scripted) {
+        return -1;
+    }
+    temp->temperature = *scripted;
+    return 0;
+}
+
+static int note_indication(const char *name, bsp_ind_callback callback)
+{
+    say("ind %s%s", name, callback == nullptr ? " null" : "");
+    return -1; // the daemon ignores it
+}
+
+int kiv_bsp_register_battery_online_ind(bsp_ind_callback callback)
+{
+    return note_indication("battery_online", callback);
+}
+
+int kiv_bsp_register_battery_offline_ind(bsp_ind_callback callback)
+{
+    return note_indication("battery_offline", callback);
+}
+
+int kiv_bsp_register_charger_connect_ind(bsp_ind_callback callback)
+{
+    return note_indication("charger_connect", callback);
+}
+
+int kiv_bsp_register_charger_disconnect_ind(bsp_ind_callback callback)
+{
+    return note_indication("charger_disconnect", callback);
+}
+
+int kiv_lib_led_relight_msg(void)
+{
+    say("relight");
+    return -1; // the daemon ignores it
+}
+
+int libkiv_tr181_Init(void)
+{
+    say("tr181_init");
+    return -1; // the daemon ignores it
+}
+
+int libkiv_tr181_set_tbl(int table_id, void *data, int arg3, int arg4)
+{
+    say("tr181 %d %d %d%s", table_id, arg3, arg4, dump(data, KIV_TR181_RECORD_SIZE).c_str());
+    return device.tr181_result;
+}
