@@ -3,6 +3,7 @@
 
 #include <cstdio>
 #include <cstdlib>
+#include <ctime>
 #include <semaphore.h>
 
 static void block_for_good()
@@ -18,6 +19,7 @@ static void block_for_good()
 int main()
 {
     std::setvbuf(stdout, nullptr, _IONBF, 0); // a line shows at once, and stdio allocates nothing later
+    tzset();                                  // gmtime would read the time zone, and allocate, at its first call
     if (kiv_led_start() != 0) {
         return EXIT_FAILURE;
     }
