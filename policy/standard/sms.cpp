@@ -28,7 +28,7 @@ static char no_argument[] = "";
 
 static void show_sms_state(sms_state state)
 {
-    kiv_led_apply(kiv_led_set_sms_led_operation, sms_steps[state]);
+    kiv_led_apply(kiv_led_set_sms_led_operation, sms_steps[static_cast<unsigned>(state)]);
 }
 
 static sms_state read_unread_state()
