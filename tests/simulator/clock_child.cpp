@@ -61,7 +61,7 @@ void *tick(void *)
         while (pthread_cond_timedwait(&on_monotonic_clock, &mutex, &next) == 0)
             say("signalled");
         touch_unguarded();
-        if (count <= 2 || count % 1000 == 0)
+        if (count <= 2 || count == 2000 || count == 4320)
             say("tick " + std::to_string(count));
     }
 }
@@ -94,6 +94,31 @@ void use_library_threads()
     lock.unlock();
     worker.join();
     say("worker done");
+}
+
+// Whoever waits longest goes first, at the condition and at the mutex behind it.
+void wake_all_at_once()
+{
+    std::mutex guard;
+    std::condition_variable changed;
+    bool open = false;
+    const auto wait = [&] {
+        std::unique_lock lock(guard);
+        changed.wait(lock, [&] { return open; });
+        say("through");
+    };
+    std::thread first(wait);
+    std::thread second(wait);
+    std::thread third(wait);
+    usleep(1000);
+    {
+        const std::lock_guard lock(guard);
+        open = true;
+        changed.notify_all();
+    }
+    third.join();
+    second.join();
+    first.join();
 }
 
 void wait_on_descriptors()
@@ -134,6 +159,7 @@ int main()
     say(result == &mutex ? "joined" : "not joined");
     const int status = system("cat /sys/class/leds/led:test/brightness; echo preload=$LD_PRELOAD");
     say("shell " + std::to_string(status));
+    wake_all_at_once();
     sem_init(&never, 0, 0);
     sem_wait(&never);
 }

@@ -60,10 +60,11 @@ constexpr const char *A_DAY = "0.000 t1 started\n"
                               "70.000 t1 joined\n"
                               "7\npreload=\n"
                               "70.000 t1 shell 0\n"
-                              "20000.000 t3 tick 1000\n"
+                              "70.001 t6 through\n"
+                              "70.001 t7 through\n"
+                              "70.001 t8 through\n"
                               "40000.000 t3 tick 2000\n"
-                              "60000.000 t3 tick 3000\n"
-                              "80000.000 t3 tick 4000\n";
+                              "86400.000 t3 tick 4320\n";
 } // namespace
 
 TEST(Clock, OrdersEveryThreadByVirtualTime)
