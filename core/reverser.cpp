@@ -3,7 +3,7 @@
 #include "core/led_log.h"
 #include "kiv/socket.h"
 
-#include <cstdio>
+#include <charconv>
 
 constexpr char led_log_source[] = "kiv_mirta_led";
 constexpr uint32_t reverser_event = 0x20000000; // by which the main-control module knows the LED daemon's answer
@@ -18,7 +18,7 @@ void kiv_led_send_common_reverser_msg(uint16_t dest_module_id, int value)
     message.us_source_module_id = KIV_MODULE_LED;
     message.ul_event_mask = reverser_event;
     message.us_data_len = sizeof message.ul_event_mask + reverser_text_length;
-    std::snprintf(message.p_data, sizeof message.p_data, "%d", value);
+    std::to_chars(message.p_data, message.p_data + sizeof message.p_data - 1, value);
 
     if (kiv_msg_send(&message, message.us_data_len) == 0) {
         LED_INFO("%s: send common reverser success.\n", __func__);
