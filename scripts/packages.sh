@@ -25,7 +25,7 @@ quietly() {
 }
 
 build_packages=(g++ cmake ninja-build libcli11-dev)
-test_packages=(libgtest-dev)
+test_packages=(python3 libgtest-dev)
 
 # build_preset PRESET TARGET... configures and builds into build/PRESET/.
 build_preset() {
