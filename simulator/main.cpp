@@ -169,6 +169,7 @@ int check(const std::vector<std::string> &paths)
 }
 } // namespace
 
+// NOLINTNEXTLINE(bugprone-exception-escape): without memory the simulator ends
 int main(int argc, char **argv)
 {
     CLI::App app("Plays the rest of the device around the LED daemon, and shows what its LEDs do.");

@@ -49,6 +49,7 @@
     X(openat)
 
 struct real_functions {
+// NOLINTNEXTLINE(bugprone-macro-parentheses): a name that is declared takes none
 #define X(name) decltype(&::name) name;
     KIV_REAL_FUNCTIONS(X)
 #undef X
