@@ -107,6 +107,7 @@ launch_plan plan_launch(const daemon_options &options, const std::string &device
 std::vector<char *> pointers(std::vector<std::string> &texts)
 {
     std::vector<char *> list;
+    list.reserve(texts.size() + 1);
     for (std::string &text : texts)
         list.push_back(text.data());
     list.push_back(nullptr);
