@@ -106,7 +106,7 @@ constexpr std::array states = {
     state_row{REMINDED,                      "allowance nearly used up: of seven seconds of a call, one",
               "nv data_volume_limit_switch=1 data_volume_limit_unit=data data_volume_limit_size=4_1024\n"
               "nv data_volume_alert_percent=75 monthly_tx_bytes=4294967296 monthly_rx_bytes=0\n"
-              "nv q6_ppp_status=q6_ppp_connected\nnotify PPP PPP_STATUS 1\nafter 6s"                                                                                           },
+              "nv q6_ppp_status=q6_ppp_connected\nnotify PPP PPP_STATUS 1\nafter 12s"                                                                                          },
 };
 
 unsigned mask_of(const product_name &product)
