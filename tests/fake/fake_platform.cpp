@@ -21,6 +21,7 @@
 
 constexpr size_t longest_record = 5000;
 constexpr size_t most_timers = 64;
+constexpr int ignored = -1;     // where the daemon does not look at the result
 constexpr size_t long_run = 20; // from here on a run of one character is shown as x{20}
 
 static fake_device device;
@@ -216,12 +217,6 @@ void kiv_mem_cpy(void *dest, const void *src, size_t size)
     std::memcpy(dest, src, size);
 }
 
-int kiv_reg_table_init(int module_id)
-{
-    say("reg_table %d", module_id);
-    return 0;
-}
-
 int kiv_reg_proc(int source_module_id, const uint32_t *masks)
 {
     say("reg_proc %d %x %x %x %x", source_module_id, masks[0], masks[1], masks[2], masks[3]);
@@ -232,7 +227,7 @@ int kiv_reg_func(int source_module_id, int dest_module_id, const reg_masks *mask
 {
     say("reg %d %d %x %x %x %x", source_module_id, dest_module_id, masks->mask1, masks->mask2, masks->mask3,
         masks->mask4);
-    return -1; // the daemon ignores it
+    return ignored;
 }
 
 int kiv_cfg_get_item(int item, void *buffer, int size)
@@ -262,13 +257,7 @@ int kiv_nvconfig_write(const char *key, const char *value, int length)
 {
     say("nv write %s \"%s\" %d", key, value, length);
     fake_set_nv(key, std::string(value, static_cast<size_t>(length)));
-    return -1; // the daemon ignores it
-}
-
-int kiv_ipc_init(int log_id, int flag)
-{
-    say("ipc %d %d", log_id, flag);
-    return 0;
+    return ignored;
 }
 
 int kiv_timer(void (*callback)(void *), void *argument, int period_ms, int repeat)
@@ -295,7 +284,7 @@ int kiv_delete_timer(int handle)
     say("delete %d", handle);
     const std::lock_guard lock(device_mutex);
     device.timers.erase(handle);
-    return -1; // the daemon ignores it
+    return ignored;
 }
 
 // All five fields: what is not shown is 0.
@@ -323,7 +312,7 @@ int kiv_bsp_set_leds_sync(led_request request, int *result)
     ++led_requests;
     const auto found = device.led_results.find(request.led_id);
     *result = found == device.led_results.end() ? 0 : found->second;
-    return -1; // the daemon ignores it
+    return ignored;
 }
 
 static int answer(const char *query, const std::optional<bsp_query_result> &scripted, bsp_query_result *result)
@@ -334,16 +323,6 @@ static int answer(const char *query, const std::optional<bsp_query_result> &scri
     }
     *result = *scripted;
     return 0;
-}
-
-int kiv_bsp_get_charger_connect_status_sync(bsp_query_result *result)
-{
-    return answer("charger", device.charger, result);
-}
-
-int kiv_bsp_get_battery_online_status_sync(bsp_query_result *result)
-{
-    return answer("battery", device.battery, result);
 }
 
 int kiv_bsp_get_sensor_temp_sync(int sensor_id, bsp_sensor_temp *temp)
@@ -360,39 +339,7 @@ int kiv_bsp_get_sensor_temp_sync(int sensor_id, bsp_sensor_temp *temp)
 static int note_indication(const char *name, bsp_ind_callback callback)
 {
     say("ind %s%s", name, callback == nullptr ? " null" : "");
-    return -1; // the daemon ignores it
-}
-
-int kiv_bsp_register_battery_online_ind(bsp_ind_callback callback)
-{
-    return note_indication("battery_online", callback);
-}
-
-int kiv_bsp_register_battery_offline_ind(bsp_ind_callback callback)
-{
-    return note_indication("battery_offline", callback);
-}
-
-int kiv_bsp_register_charger_connect_ind(bsp_ind_callback callback)
-{
-    return note_indication("charger_connect", callback);
-}
-
-int kiv_bsp_register_charger_disconnect_ind(bsp_ind_callback callback)
-{
-    return note_indication("charger_disconnect", callback);
-}
-
-int kiv_lib_led_relight_msg(void)
-{
-    say("relight");
-    return -1; // the daemon ignores it
-}
-
-int libkiv_tr181_Init(void)
-{
-    say("tr181_init");
-    return -1; // the daemon ignores it
+    return ignored;
 }
 
 int libkiv_tr181_set_tbl(int table_id, void *data, int arg3, int arg4)
@@ -400,3 +347,16 @@ int libkiv_tr181_set_tbl(int table_id, void *data, int arg3, int arg4)
     say("tr181 %d %d %d%s", table_id, arg3, arg4, dump(data, KIV_TR181_RECORD_SIZE).c_str());
     return device.tr181_result;
 }
+
+// clang-format off
+int kiv_reg_table_init(int module_id) { say("reg_table %d", module_id); return 0; }
+int kiv_ipc_init(int log_id, int flag) { say("ipc %d %d", log_id, flag); return 0; }
+int kiv_lib_led_relight_msg(void) { say("relight"); return ignored; }
+int libkiv_tr181_Init(void) { say("tr181_init"); return ignored; }
+int kiv_bsp_get_charger_connect_status_sync(bsp_query_result *to) { return answer("charger", device.charger, to); }
+int kiv_bsp_get_battery_online_status_sync(bsp_query_result *to) { return answer("battery", device.battery, to); }
+int kiv_bsp_register_battery_online_ind(bsp_ind_callback call) { return note_indication("battery_online", call); }
+int kiv_bsp_register_battery_offline_ind(bsp_ind_callback call) { return note_indication("battery_offline", call); }
+int kiv_bsp_register_charger_connect_ind(bsp_ind_callback call) { return note_indication("charger_connect", call); }
+int kiv_bsp_register_charger_disconnect_ind(bsp_ind_callback to) { return note_indication("charger_disconnect", to); }
+// clang-format on
