@@ -109,6 +109,8 @@ static int read_max(const char *folder)
         return -errno;
     const ssize_t length = read(fd, text, sizeof text - 1);
     close(fd);
+    if (length == 0)
+        return -ENOENT; // its disk was full when it was made
     if (length < 0 || standin_parse_ints(text, &value, 1) != 1 || value <= 0)
         return -EIO;
     return value;
