@@ -26,6 +26,7 @@ quietly() {
 
 build_packages=(g++ cmake ninja-build libcli11-dev)
 test_packages=(python3 libgtest-dev)
+armv7_packages=(g++-arm-linux-gnueabihf qemu-user googletest)
 
 # build_preset PRESET TARGET... configures and builds into build/PRESET/.
 build_preset() {
