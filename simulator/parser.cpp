@@ -5,6 +5,7 @@
 namespace
 {
 constexpr int MAX_INCLUDES_DEEP = 8;
+constexpr int MAX_INCLUDES = 1000;
 constexpr size_t MAX_REPEATS_DEEP = 8;
 constexpr size_t MAX_STATEMENTS = 100'000;
 constexpr size_t MAX_LINE = 8192;
@@ -16,6 +17,7 @@ struct reading {
     std::string &error;
     size_t statements = 0;
     int includes_deep = 0;
+    int includes = 0;
 };
 
 // One of its files, and the repeats that it has opened, outermost first.
@@ -52,6 +54,8 @@ bool include(reading &state, source &from, const std::vector<word> &words)
         return refuse(state, from, from.line, "include \"FILE\"");
     if (state.includes_deep == MAX_INCLUDES_DEEP)
         return refuse(state, from, from.line, "includes are nested more than 8 deep");
+    if (++state.includes > MAX_INCLUDES)
+        return refuse(state, from, from.line, "more than 1000 files are included");
     const std::string path = beside(state.story.files[from.file], words[1].text);
     std::string text;
     if (!state.load(path, text))

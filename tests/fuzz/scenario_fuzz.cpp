@@ -1,4 +1,5 @@
-// The scenario parser over any text. An include finds the text itself again, so that includes nest.
+// The scenario parser over any text. An include finds the text itself again, so that includes nest; a name with a
+// folder grows with every level, until it is long and names an empty file.
 #include "scenario.h"
 
 #include <cstdint>
@@ -7,6 +8,8 @@
 
 extern "C" int LLVMFuzzerInitialize(int *argc, char ***argv);
 extern "C" int LLVMFuzzerTestOneInput(const uint8_t *data, size_t size);
+
+constexpr size_t longest_path = 10;
 
 int LLVMFuzzerInitialize(int *, char ***)
 {
@@ -21,7 +24,7 @@ int LLVMFuzzerTestOneInput(const uint8_t *data, size_t size)
     const bool parsed = parse_scenario(
         text, "input.scn",
         [&](const std::string &path, std::string &included) {
-            included = text;
+            included = path.size() > longest_path ? "" : text;
             return !path.ends_with("missing.scn");
         },
         story, error);
