@@ -45,13 +45,18 @@ static std::vector<int> wait_for(size_t count)
     return fired.ids;
 }
 
+static void forget_fired()
+{
+    const std::lock_guard guard(fired.lock);
+    fired.ids.clear();
+    fired.times.clear();
+}
+
 struct timers : standin_device {
     void SetUp() override
     {
         standin_device::SetUp();
-        const std::lock_guard guard(fired.lock);
-        fired.ids.clear();
-        fired.times.clear();
+        forget_fired();
     }
 };
 
@@ -68,18 +73,28 @@ TEST_F(timers, FireInOrderOfTheirDeadlines)
     EXPECT_GE(fired.times[2] - start, 89);
 }
 
-// The service is held past the second tick: one late tick, then the third on time. A timer that counts from when it
-// fired comes a whole period later; one that makes up every tick comes at once.
-TEST_F(timers, PeriodicTimerKeepsItsPhaseWithoutABurst)
+// Holds the service past the second tick. The late tick comes once, after the hold; how soon the next one follows.
+static long long gap_after_late_tick()
 {
     useconds_t hold_us = 180000;
     const long long start = now_ms();
+    forget_fired();
     const int handle = kiv_timer(record, &one, 100, 1);
     EXPECT_GT(kiv_timer(hold_service, &hold_us, 95, 0), 0);
     wait_for(2);
     kiv_delete_timer(handle);
     EXPECT_GE(fired.times[1] - start, 299);
-    EXPECT_LT(fired.times[1] - fired.times[0], 95);
+    return fired.times[1] - fired.times[0];
+}
+
+// A timer that counts from when it fired always comes a whole period later; one that keeps its phase comes sooner,
+// unless the machine itself was late.
+TEST_F(timers, PeriodicTimerKeepsItsPhaseWithoutABurst)
+{
+    long long gap = gap_after_late_tick();
+    for (int attempt = 0; attempt < 9 && gap >= 95; attempt++)
+        gap = gap_after_late_tick();
+    EXPECT_LT(gap, 95);
 }
 
 TEST_F(timers, CallbackDeletesItsOwnTimer)
