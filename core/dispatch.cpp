@@ -149,30 +149,32 @@ struct notification_row {
     const char *guarded = nullptr; // dropped under this name unless on and awake
 };
 
+// clang-format off
 constexpr auto notification_rows = std::array{
-    notification_row{KIV_MODULE_MDM,                REG_SIM_STATUS,            "recv REG_SIM_STATUS\n",              false,                                                   on_sim                                                                                                      },
-    notification_row{KIV_MODULE_NWINFO,             REG_NWINFO_ROAMING_STATUS, "recv  REG_NWINFO_ROAMING_STATUS \n", false,
-                     on_roaming                                                                                                                                                                                                                                                           },
-    notification_row{KIV_MODULE_NWINFO,             REG_NWINFO_NETTYPE,        "recv  REG_NWINFO_NETTYPE \n",        false,                                                   on_net_type                                                                                                 },
-    notification_row{KIV_MODULE_NWINFO,             REG_NWINFO_SIG_BAR,        "recv  REG_NWINFO_SIG_BAR \n",        false,                                                   on_signal                                                                                                   },
-    notification_row{KIV_MODULE_PPP,                REG_PPP_STATUS,            "recv REG_PPP_STATUS p_data=",        true,                                                    recv_pppStatus                                                                                              },
-    notification_row{KIV_MODULE_PPP,                REG_Q6_PPP_STATUS,         "recv REG_Q6_PPP_STATUS p_data=",     true,                                                    on_q6_ppp                                                                                                   },
-    notification_row{KIV_MODULE_WLAN,               REG_WLAN_AP_WPS_STATE,     "recv REG_WLAN_AP_WPS_STATE p_data=", true,
-                     kiv_led_wps_status_dispatch,                                                                                                                                                                                                                                           "WPS"},
-    notification_row{KIV_MODULE_WLAN,                             REG_WLAN_AP_WPS_STATE_CHIP2,                                        "recv REG_WLAN_AP_WPS_STATE p_data=",                     true,
-                     kiv_led_wps_status_dispatch,                                                                                     "WPS"},
-    notification_row{KIV_MODULE_WLAN,                        REG_WLAN_CURRENT_STATUS,
-                     " recv REG_WLAN_CURRENT_STATUS wifi status= p_data=",                                                                       true,                                                                                kiv_led_wlan_status_dispatch,                                                                                                                                                                                                                  "WLAN"},
-    notification_row{KIV_MODULE_SMS, REG_WMS_SMS_NV_UNREAD_SMS,                    nullptr,                                                        false,                   on_unread_sms},
-    notification_row{KIV_MODULE_SMS,                        REG_WMS_SMS_NEW_SMS,                                    nullptr,                 false,                                         on_new_sms                                                                                                                                                                                                                      },
-    notification_row{KIV_MODULE_SMS,                        REG_WMS_SMS_MEMORY_FULL,                                       nullptr,                                                           false,                                                             on_sms_store_full},
-    notification_row{KIV_MODULE_SMS,                        REG_WMS_SMS_VOCEMAIL_SET_FLAG,                                "recv REG_WMS_SMS_VOCEMAIL_SET_FLAG: ",          true,
-                     recv_VoiceMailStatus                                                                                                                                           },
-    notification_row{KIV_MODULE_SLEEP,                         REG_SLEEP_STATUS_EVENT,                                     "recv REG_SLEEP_STATUS_EVENT p_data=",                                                                         true,                                                                                                                 on_sleep                                   },
-    notification_row{KIV_MODULE_DST,                         REG_DST_FLOW_STATUS,                                          "recv REG_DST_FLOW_STATUS p_data=",      true,nullptr},
-    notification_row{KIV_MODULE_VOICE,                         REG_VOICE_PHONE_LED_STATE,                                           "recv REG_VOICE_PHONE_LED_STATE p_data=",                                                                          true,
-                     recv_voicePhoneStatus                                                                                                                                                                                                                                                                                },
+    notification_row{KIV_MODULE_MDM, REG_SIM_STATUS, "recv REG_SIM_STATUS\n", false, on_sim},
+    notification_row{KIV_MODULE_NWINFO, REG_NWINFO_ROAMING_STATUS, "recv  REG_NWINFO_ROAMING_STATUS \n", false,
+                     on_roaming},
+    notification_row{KIV_MODULE_NWINFO, REG_NWINFO_NETTYPE, "recv  REG_NWINFO_NETTYPE \n", false, on_net_type},
+    notification_row{KIV_MODULE_NWINFO, REG_NWINFO_SIG_BAR, "recv  REG_NWINFO_SIG_BAR \n", false, on_signal},
+    notification_row{KIV_MODULE_PPP, REG_PPP_STATUS, "recv REG_PPP_STATUS p_data=", true, recv_pppStatus},
+    notification_row{KIV_MODULE_PPP, REG_Q6_PPP_STATUS, "recv REG_Q6_PPP_STATUS p_data=", true, on_q6_ppp},
+    notification_row{KIV_MODULE_WLAN, REG_WLAN_AP_WPS_STATE, "recv REG_WLAN_AP_WPS_STATE p_data=", true,
+                     kiv_led_wps_status_dispatch, "WPS"},
+    notification_row{KIV_MODULE_WLAN, REG_WLAN_AP_WPS_STATE_CHIP2, "recv REG_WLAN_AP_WPS_STATE p_data=", true,
+                     kiv_led_wps_status_dispatch, "WPS"},
+    notification_row{KIV_MODULE_WLAN, REG_WLAN_CURRENT_STATUS, " recv REG_WLAN_CURRENT_STATUS wifi status= p_data=",
+                     true, kiv_led_wlan_status_dispatch, "WLAN"},
+    notification_row{KIV_MODULE_SMS, REG_WMS_SMS_NV_UNREAD_SMS, nullptr, false, on_unread_sms},
+    notification_row{KIV_MODULE_SMS, REG_WMS_SMS_NEW_SMS, nullptr, false, on_new_sms},
+    notification_row{KIV_MODULE_SMS, REG_WMS_SMS_MEMORY_FULL, nullptr, false, on_sms_store_full},
+    notification_row{KIV_MODULE_SMS, REG_WMS_SMS_VOCEMAIL_SET_FLAG, "recv REG_WMS_SMS_VOCEMAIL_SET_FLAG: ", true,
+                     recv_VoiceMailStatus},
+    notification_row{KIV_MODULE_SLEEP, REG_SLEEP_STATUS_EVENT, "recv REG_SLEEP_STATUS_EVENT p_data=", true, on_sleep},
+    notification_row{KIV_MODULE_DST, REG_DST_FLOW_STATUS, "recv REG_DST_FLOW_STATUS p_data=", true, nullptr},
+    notification_row{KIV_MODULE_VOICE, REG_VOICE_PHONE_LED_STATE, "recv REG_VOICE_PHONE_LED_STATE p_data=", true,
+                     recv_voicePhoneStatus},
 };
+// clang-format on
 
 static const source_row *find_source(uint16_t module)
 {

@@ -37,15 +37,19 @@ constexpr auto ufi_registrations = std::array{
 constexpr auto paper_kite_registrations = std::array{
     registration{KIV_MODULE_WLAN, wlan_and_wps_events},
 };
+// clang-format off
 constexpr auto module_registrations = std::array{
-    registration{KIV_MODULE_SMS,   REG_WMS_SMS_VOCEMAIL_SET_FLAG, "reg SMS notify msg begin!",         "reg SMS notify msg end!"},
-    registration{KIV_MODULE_VOICE, REG_VOICE_PHONE_LED_STATE,     "reg voice phone notify msg begin!",
-                 "reg voice phone notify msg end!"                                                                              },
+    registration{KIV_MODULE_SMS, REG_WMS_SMS_VOCEMAIL_SET_FLAG, "reg SMS notify msg begin!", "reg SMS notify msg end!"},
+    registration{KIV_MODULE_VOICE, REG_VOICE_PHONE_LED_STATE, "reg voice phone notify msg begin!",
+                 "reg voice phone notify msg end!"},
 };
+// clang-format on
+// clang-format off
 constexpr auto uni_core_cpe_registrations = std::array{
-    registration{KIV_MODULE_WLAN,            wlan_and_wps_events          },
-    registration{ KIV_MODULE_VOICE, REG_VOICE_PHONE_LED_STATE, "reg voice phone notify msg!"},
+    registration{KIV_MODULE_WLAN,  wlan_and_wps_events},
+    registration{KIV_MODULE_VOICE, REG_VOICE_PHONE_LED_STATE, "reg voice phone notify msg!"},
 };
+// clang-format on
 
 static std::span<const registration> registrations_of_this_product()
 {

@@ -15,18 +15,20 @@
 
 constexpr char led_log_source[] = "kiv_mirta_led_cpe";
 
+// clang-format off
 constexpr auto mc_event_rows = std::array{
-    mc_event_row{REG_MC_EVENT_POWERON,       "recv REG_MC_EVENT_POWERON \n",       kiv_cpe_led_set_led_when_power_on },
+    mc_event_row{REG_MC_EVENT_POWERON, "recv REG_MC_EVENT_POWERON \n", kiv_cpe_led_set_led_when_power_on},
     mc_event_row{REG_MC_EVENT_SHUTTING_DOWN, "recv REG_MC_EVENT_SHUTTING_DOWN \n", kiv_cpe_led_set_led_when_power_off,
                  REVERSER_SHUTTING_DOWN},
-    mc_event_row{REG_MC_EVENT_RESTARTING,                          "recv REG_MC_EVENT_RESTARTING \n",                                        kiv_cpe_led_set_all_leds_off               },
-    mc_event_row{REG_MC_EVENT_POWER_OFF_UNREADL,                          "recv REG_MC_EVENT_POWER_OFF_UNREADL \n",
+    mc_event_row{REG_MC_EVENT_RESTARTING, "recv REG_MC_EVENT_RESTARTING \n", kiv_cpe_led_set_all_leds_off},
+    mc_event_row{REG_MC_EVENT_POWER_OFF_UNREADL, "recv REG_MC_EVENT_POWER_OFF_UNREADL \n",
                  kiv_cpe_led_set_led_when_power_off_unreal},
-    mc_event_row{REG_MC_EVENT_POWER_OFF_CHARGE,                          "recv REG_MC_EVENT_POWER_OFF_CHARGE \n",
-                 kiv_cpe_led_set_led_when_power_off_charge                 },
-    mc_event_row{REG_MC_CHARGIN_STATUS,                          "recv REG_MC_CHARGIN_STATUS\n",                                          kiv_cpe_led_handle_battery_state   },
-    mc_event_row{REG_MC_BATTERY_VALUE,                          "recv REG_MC_BATTERY_VALUE\n",                                           kiv_cpe_led_handle_battery_state                   },
+    mc_event_row{REG_MC_EVENT_POWER_OFF_CHARGE, "recv REG_MC_EVENT_POWER_OFF_CHARGE \n",
+                 kiv_cpe_led_set_led_when_power_off_charge},
+    mc_event_row{REG_MC_CHARGIN_STATUS, "recv REG_MC_CHARGIN_STATUS\n", kiv_cpe_led_handle_battery_state},
+    mc_event_row{REG_MC_BATTERY_VALUE, "recv REG_MC_BATTERY_VALUE\n", kiv_cpe_led_handle_battery_state},
 };
+// clang-format on
 
 static void enter_power_state(power_state state)
 {

@@ -18,19 +18,21 @@
 constexpr char led_log_source[] = "kiv_mirta_led";
 constexpr int sleep_status_asleep = 5; // on this product 1 is a wake-up
 
+// clang-format off
 constexpr auto mc_event_rows = std::array{
-    mc_event_row{REG_MC_EVENT_POWERON,                      "recv REG_MC_EVENT_POWERON \n",       kiv_singelchip_led_set_led_when_power_on            },
-    mc_event_row{REG_MC_EVENT_SHUTTING_DOWN,                "recv REG_MC_EVENT_SHUTTING_DOWN \n",
-                 kiv_singelchip_led_set_led_when_power_off,                                                                                             REVERSER_SHUTTING_DOWN},
-    mc_event_row{REG_MC_EVENT_RESETTING,                                         "recv REG_MC_EVENT_RESETTING \n",                                                        kiv_singelchip_led_set_led_when_resetting,
+    mc_event_row{REG_MC_EVENT_POWERON, "recv REG_MC_EVENT_POWERON \n", kiv_singelchip_led_set_led_when_power_on},
+    mc_event_row{REG_MC_EVENT_SHUTTING_DOWN, "recv REG_MC_EVENT_SHUTTING_DOWN \n",
+                 kiv_singelchip_led_set_led_when_power_off, REVERSER_SHUTTING_DOWN},
+    mc_event_row{REG_MC_EVENT_RESETTING, "recv REG_MC_EVENT_RESETTING \n", kiv_singelchip_led_set_led_when_resetting,
                  REVERSER_RESETTING},
-    mc_event_row{REG_MC_EVENT_RESTARTING,                        "recv REG_MC_EVENT_RESTARTING \n",                                                            kiv_singlechip_330x_led_set_all_leds_off                                                                                         },
+    mc_event_row{REG_MC_EVENT_RESTARTING, "recv REG_MC_EVENT_RESTARTING \n", kiv_singlechip_330x_led_set_all_leds_off},
     mc_event_row{REG_MC_EVENT_POWER_OFF_UNREADL, "recv REG_MC_EVENT_POWER_OFF_UNREADL \n",
                  kiv_singelchip_led_set_led_when_power_off},
-    mc_event_row{REG_MC_CHARGIN_STATUS, "recv REG_MC_CHARGIN_STATUS\n",                                     nullptr                                                                                                                                                             },
-    mc_event_row{REG_MC_EVENT_POWER_OFF_CHARGE,                                  "recv REG_MC_EVENT_POWER_OFF_CHARGE \n",                                  nullptr},
-    mc_event_row{REG_MC_BATTERY_VALUE,                                  "recv REG_MC_BATTERY_VALUE\n",                                     nullptr                                                                                                                                                                         },
+    mc_event_row{REG_MC_CHARGIN_STATUS, "recv REG_MC_CHARGIN_STATUS\n", nullptr},
+    mc_event_row{REG_MC_EVENT_POWER_OFF_CHARGE, "recv REG_MC_EVENT_POWER_OFF_CHARGE \n", nullptr},
+    mc_event_row{REG_MC_BATTERY_VALUE, "recv REG_MC_BATTERY_VALUE\n", nullptr},
 };
+// clang-format on
 
 constexpr auto white_steps = std::array{
     led_step{LED_WIFI_BLUE, LED_OP_ON, 0, 0, 2},

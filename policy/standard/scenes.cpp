@@ -47,27 +47,29 @@ constexpr auto flash_end_steps = std::array{
     led_step{LED_NET_14,   LED_OP_OFF, 0, 0, 0},
 };
 
+// clang-format off
 constexpr auto mc_event_rows = std::array{
-    mc_event_row{REG_MC_EVENT_POWERON,                          "recv REG_MC_EVENT_POWERON \n",       kiv_led_set_led_when_power_on          },
-    mc_event_row{REG_MC_EVENT_SHUTTING_DOWN,                    "recv REG_MC_EVENT_SHUTTING_DOWN \n", kiv_led_set_led_when_power_off,
+    mc_event_row{REG_MC_EVENT_POWERON, "recv REG_MC_EVENT_POWERON \n", kiv_led_set_led_when_power_on},
+    mc_event_row{REG_MC_EVENT_SHUTTING_DOWN, "recv REG_MC_EVENT_SHUTTING_DOWN \n", kiv_led_set_led_when_power_off,
                  REVERSER_SHUTTING_DOWN},
-    mc_event_row{REG_MC_EVENT_RESETTING,                                             "recv REG_MC_EVENT_RESETTING \n",                                                            kiv_led_set_led_when_resetting,
+    mc_event_row{REG_MC_EVENT_RESETTING, "recv REG_MC_EVENT_RESETTING \n", kiv_led_set_led_when_resetting,
                  REVERSER_RESETTING},
-    mc_event_row{REG_MC_EVENT_RESTARTING,                            "recv REG_MC_EVENT_RESTARTING \n",                                                                kiv_led_set_all_leds_off                                                                                },
-    mc_event_row{REG_MC_EVENT_POWER_OFF_CHARGE,                     "recv REG_MC_EVENT_POWER_OFF_CHARGE \n",
+    mc_event_row{REG_MC_EVENT_RESTARTING, "recv REG_MC_EVENT_RESTARTING \n", kiv_led_set_all_leds_off},
+    mc_event_row{REG_MC_EVENT_POWER_OFF_CHARGE, "recv REG_MC_EVENT_POWER_OFF_CHARGE \n",
                  kiv_led_set_led_when_power_off_charge},
-    mc_event_row{REG_MC_EVENT_POWER_OFF_UNREADL,         "recv REG_MC_EVENT_POWER_OFF_UNREADL \n",
-                 kiv_led_set_led_when_power_off_unreal                                                                                                                                  },
-    mc_event_row{REG_MC_EVENT_POWER_OFF_QUICKEN,         "recv REG_MC_EVENT_POWER_OFF_QUICKEN\n",
+    mc_event_row{REG_MC_EVENT_POWER_OFF_UNREADL, "recv REG_MC_EVENT_POWER_OFF_UNREADL \n",
+                 kiv_led_set_led_when_power_off_unreal},
+    mc_event_row{REG_MC_EVENT_POWER_OFF_QUICKEN, "recv REG_MC_EVENT_POWER_OFF_QUICKEN\n",
                  kiv_led_set_led_when_power_off_quicken},
-    mc_event_row{REG_MC_EVENT_POWER_OFF_CHARGE_QUICKEN,        "recv REG_MC_EVENT_POWER_OFF_CHARGE_QUICKEN\n",
-                 kiv_led_set_led_when_power_off_charge_quicken                                                                                                                          },
-    mc_event_row{REG_MC_EVENT_POWER_OFF_QUICKEN_ACK, nullptr,                                     kiv_led_set_led_when_power_off_quicken,
+    mc_event_row{REG_MC_EVENT_POWER_OFF_CHARGE_QUICKEN, "recv REG_MC_EVENT_POWER_OFF_CHARGE_QUICKEN\n",
+                 kiv_led_set_led_when_power_off_charge_quicken},
+    mc_event_row{REG_MC_EVENT_POWER_OFF_QUICKEN_ACK, nullptr, kiv_led_set_led_when_power_off_quicken,
                  REVERSER_POWER_OFF_QUICKEN},
-    mc_event_row{REG_MC_EVENT_INITAL,       "recv REG_MC_EVENT_INITAL\n",                                                          kiv_led_set_led_when_initial                                                                                                },
-    mc_event_row{REG_MC_CHARGIN_STATUS,           "recv REG_MC_CHARGIN_STATUS\n",kiv_led_battery_query_dispatch},
-    mc_event_row{REG_MC_BATTERY_VALUE,     "recv REG_MC_BATTERY_VALUE\n",                                                  kiv_led_battery_query_dispatch                                                                                                                                                                                        },
+    mc_event_row{REG_MC_EVENT_INITAL, "recv REG_MC_EVENT_INITAL\n", kiv_led_set_led_when_initial},
+    mc_event_row{REG_MC_CHARGIN_STATUS, "recv REG_MC_CHARGIN_STATUS\n", kiv_led_battery_query_dispatch},
+    mc_event_row{REG_MC_BATTERY_VALUE, "recv REG_MC_BATTERY_VALUE\n", kiv_led_battery_query_dispatch},
 };
+// clang-format on
 
 static void set_leds(std::span<const led_step> steps)
 {
