@@ -179,7 +179,7 @@ TEST(core, MessagesFromOutside)
         6 "recv_msg.us_source_module_id is 1" | 6 "recv_msg.us_cmd is 6916"
         6 "[info] msg KIV_MSG_CMD_LED_CPE_RESET_MSG \n" | 6 "[info] enter messageParse fun\n"
         6 "recv_msg.us_source_module_id is 1" | 6 "recv_msg.us_cmd is 12033")",
-        [] { led_enable = 1; command(6914); command(6915); command(6916); command(12033); });
+        [] { led_enable = 2; command(6914); command(6915); command(6916); command(12033); });
 }
 
 TEST(core, ReverserMessage)

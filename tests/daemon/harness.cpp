@@ -4,6 +4,7 @@
 
 #include <algorithm>
 #include <cstdio>
+#include <cstring>
 #include <gtest/gtest.h>
 #include <memory>
 #include <regex>
@@ -189,6 +190,7 @@ void receive(const std::string &bytes)
 {
     fake_deliver(bytes);
     const auto received = std::make_unique<received_message>(); // on the heap, where a sanitizer guards its ends
+    std::memset(received.get(), 'x', sizeof *received);         // as a longer message before it leaves it
     kiv_led_receive_message(*received);
 }
 

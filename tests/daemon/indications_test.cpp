@@ -148,7 +148,7 @@ TEST(voice, RoutedByProduct)
         "voice off | led 60 blink 400/1600 4 | voice off | led 60 on 4 | voice off | led 60 off",
         [] { product_on(LED_PRODUCT_UNI_CORE_CPE); cur_led_sleep_status = 1; notify(43, 2, "PHONE BLINK");
              notify(43, 2, "PHONE BLINK"); led_power_state = POWER_OFF; notify(43, 2, "PHONE LED ON");
-             notify(43, 2, "PHONE LED ON and more"); notify(43, 2, std::string(1020, 'P')); });
+             notify(43, 2, "phone led on"); notify(43, 2, "PHONE LED ON" + std::string(1008, '!')); });
     expect_effects("module, voicemail there alone",
         "voice off | led 60 blink 1000/1000 4 | voicemail off | led 63 blink 1000/1000 1",
         [] { product_on(LED_PRODUCT_MODULE);

@@ -30,6 +30,7 @@ static void operate_each_group()
     kiv_led_set_flow_led_operation(10, 0, 0, 0, 1);
     kiv_led_set_voicemail_led_operation(63, 2, 1000, 1000, 1);
     kiv_led_set_voicemail_led_operation(63, 1, 0, 0, 0);
+    kiv_led_set_voicemail_led_operation(65, 0, 0, 0, 1);
     kiv_led_set_voicemail_led_operation(61, 0, 0, 0, 1);
     kiv_led_set_voicemail_led_operation(66, 1, 0, 0, 0);
     kiv_led_set_voice_led_operation(60, 0, 0, 0, 4);
@@ -51,7 +52,8 @@ TEST(led_groups, OperationsInOrder)
     expect_effects("requests", R"(
         led 6 on 4 | net off | led 17 on 2 | led 44 off | led 45 off | led 46 off | led 47 off | led 45 blink 1/2 3
         led 52 on 2 | bat off | led 1 blink 800/1200 4 | led 43 on 2 | sms off | led 50 on 4 | led 9 off | led 12 off
-        led 10 off | led 11 off | led 10 on 1 | voicemail off | led 63 blink 1000/1000 1 | led 63 off | voice off
+        led 10 off | led 11 off | led 10 on 1 | voicemail off | led 63 blink 1000/1000 1 | led 63 off
+        voicemail off | led 65 on 1 | voice off
         led 60 on 4 | led 66 off | led 67 off | led 68 off | led 69 off | led 70 off | led 71 off | led 72 off
         led 73 off | led 74 off | led 75 off | led 76 off | led 77 off | led 78 off | led 79 off | led 80 off
         led 81 off | led 70 on 1 | led 41 on 4)", operate_each_group);
@@ -72,6 +74,8 @@ TEST(led_groups, OperationsInOrder)
         6_operation "enter kiv_led_set_flow_led_operation led_id=10,led_operation=0\n"
         6_operation "kiv_led_set_voicemail_led_off"
         6_operation "kiv_led_set_voicemail_led_operation led_id=63,led_operation=2\n"
+        6_operation "kiv_led_set_voicemail_led_off"
+        6_operation "kiv_led_set_voicemail_led_operation led_id=65,led_operation=0\n"
         0_operation "kiv_led_set_voicemail_led_operation led_id error\n"
         0_operation "kiv_led_set_voicemail_led_operation led_id error\n" | 6_operation "kiv_led_set_voice_led_off"
         6_operation "kiv_led_set_voice_led_operation led_id=60,led_operation=0\n"

@@ -28,8 +28,9 @@ static void power_on_with(std::deque<std::string> rolling_leds)
 TEST(ufi, PowerEvents)
 {
     expect_effects("shutting down, with a new SMS and a shown net",
-        "delete 1 | handheld off |" + reverser + "4096\" | power 2 sleep 0",
-        [] { on(); notify(5, 4); forget(); mc(0x20); note_power(); });
+        "delete 1 | handheld off |" + reverser + "4096\" | power 2 sleep 0 | net 0 sms 1",
+        [] { on(); notify(5, 4); notify(23, 0x40); forget(); mc(0x20); note_power();
+             fake_note("net " + std::to_string(led_net_type) + " sms " + std::to_string(led_sms_state)); });
     expect_effects("shutting down while resetting keeps the scene",
         "handheld off | led 1 on 4 | led 41 on 4 | led 50 on 4 | led 13 on 4 |" + reverser + "4097\" |" + reverser +
         "4096\" | power 7 sleep 0",
