@@ -90,9 +90,9 @@ static void set_up(std::minstd_rand &)
 static void run(void (*source)(std::minstd_rand &), size_t index)
 {
     std::minstd_rand random(static_cast<unsigned>(index + 1));
-    while (running) {
+    while (running.load(std::memory_order_relaxed)) {
         source(random);
-        ++counts[index];
+        counts[index].fetch_add(1, std::memory_order_relaxed);
         std::this_thread::sleep_for(std::chrono::microseconds(index == 0 ? 0 : 100));
     }
 }
@@ -119,6 +119,11 @@ TEST(stress, AllSourcesAtOnce)
     const char *text = std::getenv("KIV_STRESS_SECONDS");
     const std::chrono::milliseconds duration(text == nullptr ? 3000 : 1000 * std::atol(text));
     fake_platform().sensors = {50, 90};
+    fake_platform().nv = {
+        {"data_volume_limit_unit", "data"  },
+        {"monthly_rx_bytes",       "1"     },
+        {"systime_mode",           "manual"}
+    };
     fake_platform().charger = {0, 1};
     fake_platform().battery = {0, 1};
     const int printed = dup(STDOUT_FILENO); // the night-mode check prints

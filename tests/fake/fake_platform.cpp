@@ -25,12 +25,44 @@ constexpr int ignored = -1;     // where the daemon does not look at the result
 constexpr size_t long_run = 20; // from here on a run of one character is shown as x{20}
 
 static fake_device device;
-static std::mutex device_mutex; // also held by the record; never while a timer's procedure runs
+static std::mutex device_mutex; // also guards the record; never held while a timer's procedure runs
 static std::string record;
 static size_t recorded_lines;
 static std::atomic<bool> recording;
 static std::atomic<unsigned long> led_requests;
 static int last_timer;
+
+// The thread sanitizer is not told of the fake's own locking: on a device no call of the platform orders the daemon's
+// threads, so none may hide a race here.
+#ifdef __SANITIZE_THREAD__
+extern "C" {
+void AnnotateIgnoreSyncBegin(const char *file, int line);
+void AnnotateIgnoreSyncEnd(const char *file, int line);
+void AnnotateIgnoreReadsBegin(const char *file, int line);
+void AnnotateIgnoreReadsEnd(const char *file, int line);
+void AnnotateIgnoreWritesBegin(const char *file, int line);
+void AnnotateIgnoreWritesEnd(const char *file, int line);
+}
+#define SANITIZER_IGNORES(what)                                                                                        \
+    AnnotateIgnoreSync##what(__FILE__, __LINE__), AnnotateIgnoreReads##what(__FILE__, __LINE__),                       \
+        AnnotateIgnoreWrites##what(__FILE__, __LINE__)
+#else
+#define SANITIZER_IGNORES(what) static_cast<void>(0)
+#endif
+
+struct device_lock {
+    device_lock()
+    {
+        SANITIZER_IGNORES(Begin);
+        device_mutex.lock();
+    }
+    ~device_lock()
+    {
+        device_mutex.unlock();
+        SANITIZER_IGNORES(End);
+    }
+    device_lock(const device_lock &) = delete;
+};
 
 static std::string quoted(std::string_view text)
 {
@@ -53,7 +85,7 @@ static std::string quoted(std::string_view text)
 
 __attribute__((format(printf, 1, 2))) static void say(const char *format, ...)
 {
-    if (!recording) {
+    if (!recording.load(std::memory_order_relaxed)) {
         return;
     }
     char line[2048];
@@ -69,7 +101,7 @@ static std::string dump(const void *data, size_t size)
 {
     const char *bytes = static_cast<const char *>(data);
     std::string shown;
-    if (!recording) {
+    if (!recording.load(std::memory_order_relaxed)) {
         return shown;
     }
     for (size_t i = 0; i < size; ++i) {
@@ -95,10 +127,10 @@ void fake_record(bool on)
 
 void fake_note(const std::string &line)
 {
-    if (!recording) {
+    if (!recording.load(std::memory_order_relaxed)) {
         return;
     }
-    const std::lock_guard lock(device_mutex);
+    const device_lock lock;
     if (++recorded_lines <= longest_record) {
         record += line + "\n";
     }
@@ -106,42 +138,49 @@ void fake_note(const std::string &line)
 
 std::string fake_take_record()
 {
-    const std::lock_guard lock(device_mutex);
+    const device_lock lock;
     recorded_lines = 0;
     return std::exchange(record, {});
 }
 
-bool fake_fire(int handle)
+static std::optional<fake_timer> take_timer(int handle)
 {
-    std::unique_lock lock(device_mutex);
+    const device_lock lock;
     const auto found = device.timers.find(handle);
     if (found == device.timers.end()) {
-        return false;
+        return std::nullopt;
     }
     const fake_timer timer = found->second;
     if (!timer.repeats) {
         device.timers.erase(found);
     }
-    lock.unlock();
-    timer.callback(timer.argument);
-    return true;
+    return timer;
+}
+
+bool fake_fire(int handle)
+{
+    const std::optional<fake_timer> timer = take_timer(handle);
+    if (timer) {
+        timer->callback(timer->argument);
+    }
+    return timer.has_value();
 }
 
 void fake_set_nv(const std::string &key, const std::string &value)
 {
-    const std::lock_guard lock(device_mutex);
+    const device_lock lock;
     device.nv[key] = value;
 }
 
 void fake_deliver(std::string message)
 {
-    const std::lock_guard lock(device_mutex);
+    const device_lock lock;
     device.inbox.emplace_back(std::move(message));
 }
 
 std::map<int, fake_timer> fake_timers()
 {
-    const std::lock_guard lock(device_mutex);
+    const device_lock lock;
     return device.timers;
 }
 
@@ -157,7 +196,7 @@ void kiv_syslog_append(int level, const char *file, int, int log_id, const char 
     va_start(arguments, format);
     std::vsnprintf(text, sizeof text, format, arguments);
     va_end(arguments);
-    if (!recording) {
+    if (!recording.load(std::memory_order_relaxed)) {
         return;
     }
     const std::string foreign_id = log_id == 31 ? "" : "/" + std::to_string(log_id);
@@ -167,7 +206,7 @@ void kiv_syslog_append(int level, const char *file, int, int log_id, const char 
 int kiv_init_msg(const char *queue_name, int *handle)
 {
     say("queue %s", queue_name);
-    const std::lock_guard lock(device_mutex);
+    const device_lock lock;
     if (device.failing_queue_opens > 0) {
         --device.failing_queue_opens;
         return -2;
@@ -185,7 +224,7 @@ int kiv_send_msg(const char *queue_name, const void *data, int length)
 int kiv_recv_msg(int handle, void *buffer, int size)
 {
     say("recv %d %d", handle, size);
-    const std::lock_guard lock(device_mutex);
+    const device_lock lock;
     if (device.inbox.empty()) {
         return -1;
     }
@@ -244,7 +283,7 @@ int kiv_cfg_get_item(int item, void *buffer, int size)
 int kiv_nvconfig_read(const char *key, char *buffer, int size)
 {
     say("nv %s %d", key, size);
-    const std::lock_guard lock(device_mutex);
+    const device_lock lock;
     const auto found = device.nv.find(key);
     if (found == device.nv.end()) {
         return -1;
@@ -260,20 +299,23 @@ int kiv_nvconfig_write(const char *key, const char *value, int length)
     return ignored;
 }
 
-int kiv_timer(void (*callback)(void *), void *argument, int period_ms, int repeat)
+static int new_timer(const fake_timer &timer)
 {
-    std::unique_lock lock(device_mutex);
-    int handle = 0;
+    const device_lock lock;
     if (device.failing_timers > 0) {
         --device.failing_timers;
-    } else {
-        handle = ++last_timer;
-        device.timers[handle] = {callback, argument, repeat != 0};
-        if (device.timers.size() > most_timers) {
-            device.timers.erase(device.timers.begin());
-        }
+        return 0;
     }
-    lock.unlock();
+    device.timers[++last_timer] = timer;
+    if (device.timers.size() > most_timers) {
+        device.timers.erase(device.timers.begin());
+    }
+    return last_timer;
+}
+
+int kiv_timer(void (*callback)(void *), void *argument, int period_ms, int repeat)
+{
+    const int handle = new_timer({callback, argument, repeat != 0});
     say("timer %d %s \"%s\" = %d", period_ms, repeat != 0 ? "repeat" : "once", static_cast<const char *>(argument),
         handle);
     return handle;
@@ -282,7 +324,7 @@ int kiv_timer(void (*callback)(void *), void *argument, int period_ms, int repea
 int kiv_delete_timer(int handle)
 {
     say("delete %d", handle);
-    const std::lock_guard lock(device_mutex);
+    const device_lock lock;
     device.timers.erase(handle);
     return ignored;
 }
@@ -306,10 +348,10 @@ static void note_request(const led_request &request)
 
 int kiv_bsp_set_leds_sync(led_request request, int *result)
 {
-    if (recording) {
+    if (recording.load(std::memory_order_relaxed)) {
         note_request(request);
     }
-    ++led_requests;
+    led_requests.fetch_add(1, std::memory_order_relaxed);
     const auto found = device.led_results.find(request.led_id);
     *result = found == device.led_results.end() ? 0 : found->second;
     return ignored;
