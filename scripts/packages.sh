@@ -24,8 +24,7 @@ quietly() {
     "$@" >"$log" 2>&1 || { tail -n 60 "$log" >&2; echo "error: $* failed; all of it is in $log" >&2; return 1; }
 }
 
-build_packages=(g++ cmake ninja-build libcli11-dev)
-test_packages=(python3 libgtest-dev)
+build_packages=(g++ cmake ninja-build libcli11-dev libgtest-dev python3)
 armv7_packages=(g++-arm-linux-gnueabihf qemu-user googletest)
 
 # build_preset PRESET TARGET... configures and builds into build/PRESET/.
