@@ -56,6 +56,13 @@ bool open_bus(bus &b, const std::string &device, std::string &error)
     return true;
 }
 
+void close_bus(bus &b)
+{
+    for (const int queue : b.queues)
+        close(queue);
+    b.queues.clear();
+}
+
 bool send_to_daemon(const bus &b, const std::string &bytes, std::string &error)
 {
     return send_datagram(b.device + "/bus/MSG_ID_LED", bytes, error);

@@ -11,6 +11,7 @@ struct bus {
 
 // Opens every queue but the daemon's own. The device directory is KIV_DEVICE_DIR of this process.
 bool open_bus(bus &b, const std::string &device, std::string &error);
+void close_bus(bus &b);
 
 // Neither blocks: a queue that is full is an error, because its reader waits for the clock.
 bool send_to_daemon(const bus &b, const std::string &bytes, std::string &error);

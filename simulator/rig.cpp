@@ -91,6 +91,7 @@ void take_down_rig(rig &r, bool keep_device)
 {
     kill_daemon(r.process);
     close_trace(r.trace);
+    close_bus(r.wires);
     if (!keep_device && !r.device.empty())
         remove_device(r.device);
 }

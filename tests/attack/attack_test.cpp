@@ -1,7 +1,10 @@
-#include "daemon_rig.h"
-
+// The real daemon in real time, on the simulator's device and with its other ends of the bus.
+#include "device.h"
 #include "kiv/reg.h"
 #include "kiv/socket.h"
+#include "messages.h"
+#include "rig.h"
+#include "standin.h"
 
 #include <atomic>
 #include <chrono>
@@ -9,37 +12,83 @@
 #include <cstring>
 #include <filesystem>
 #include <fstream>
+#include <gtest/gtest.h>
+#include <map>
 #include <random>
-#include <sstream>
+#include <sys/mount.h>
 #include <thread>
-#include <unistd.h>
 
-using attack = daemon_rig;
+using namespace std::chrono_literals;
 
-struct story_row {
-    int module;
-    uint32_t event;
-    const char *text;
-};
-
-constexpr story_row story[] = {
-    {KIV_MODULE_MAIN,   REG_MC_EVENT_POWERON,          "" },
-    {KIV_MODULE_MAIN,   REG_MC_BATTERY_VALUE,          "" },
-    {KIV_MODULE_NWINFO, REG_NWINFO_NETTYPE,            "" },
-    {KIV_MODULE_SMS,    REG_WMS_SMS_NEW_SMS,           "" },
-    {KIV_MODULE_PPP,    REG_PPP_STATUS,                "1"},
-    {KIV_MODULE_WLAN,   REG_WLAN_CURRENT_STATUS,       "1"},
-    {KIV_MODULE_SLEEP,  REG_SLEEP_STATUS_EVENT,        "1"},
-    {KIV_MODULE_SLEEP,  REG_SLEEP_STATUS_EVENT,        "0"},
-    {KIV_MODULE_MAIN,   REG_MC_EVENT_RESETTING,        "" },
-    {KIV_MODULE_MAIN,   REG_MC_EVENT_POWER_OFF_CHARGE, "" },
-};
-
-static int number_from(const char *variable, int otherwise)
+// Waits while the queue is full. False when it was not accepted.
+static bool post(const std::string &bytes)
 {
-    const char *text = std::getenv(variable);
-    return text == nullptr ? otherwise : std::atoi(text);
+    return kiv_send_msg("MSG_ID_LED", bytes.data(), static_cast<int>(bytes.size())) == 0;
 }
+
+// The daemon answers it with a message to the main control.
+static const std::string question = notification(KIV_MODULE_MAIN, REG_MC_EVENT_POWER_OFF_QUICKEN_ACK, "");
+
+struct attack : testing::Test {
+    rig r;
+    std::string disk; // a small one that holds the device, its trace beside it
+    std::string error;
+
+    void SetUp() override { open("DRIVER_UFI"); }
+    void TearDown() override
+    {
+        close();
+        unsetenv("TMPDIR");
+        umount2(disk.c_str(), MNT_DETACH);
+        for (const char *file : {"", ".trace"})
+            remove_device(disk.empty() ? disk : disk + file);
+    }
+
+    void open(const char *product)
+    {
+        standin_reload(); // of this process, which may have had another device before
+        ASSERT_TRUE(set_up_rig(r, {KIV_DAEMON, "", "", true}, disk.empty() ? disk : disk + ".trace", error)) << error;
+        write("cfg/6000", product);
+    }
+    void close()
+    {
+        take_down_rig(r, false);
+        r = {};
+    }
+    void write(const std::string &file, const std::string &text) const
+    {
+        std::string failure;
+        EXPECT_TRUE(write_device_file(r.device, {file, text}, failure)) << failure;
+    }
+    std::string trace() const
+    {
+        std::string text;
+        read_file(r.trace_path, text);
+        return text;
+    }
+    // Waits ten seconds at least: a sanitizer makes it slow, but not that slow.
+    bool shows(const std::string &text, size_t from = 0) const
+    {
+        bool shown = false;
+        for (int tries = 0; !shown && tries < 5000; tries++, std::this_thread::sleep_for(2ms))
+            shown = trace().find(text, from) != std::string::npos;
+        return shown;
+    }
+    void launch() { ASSERT_TRUE(::launch(r.process, r.options, r.device, r.trace_path, 0, 0, error)) << error; }
+    bool start()
+    {
+        const size_t before = trace().size();
+        drain(r.wires);
+        launch();
+        return shows("kiv_send_msg(\"MSG_ID_DAEMON\", 104) = 0", before) && post(start_record());
+    }
+    bool answers() const
+    {
+        const size_t before = trace().size();
+        drain(r.wires);
+        return post(question) && shows("\"4104\", 8) = 0", before);
+    }
+};
 
 // Anything but a message of the main control, which alone is answered.
 static void flood(unsigned seed, const std::atomic<bool> &stop, std::atomic<long> &sent)
@@ -66,21 +115,20 @@ TEST_F(attack, FloodLosesNoAcceptedNotification)
     std::atomic<int> accepted = 0;
     int answered = 0;
     ASSERT_TRUE(start());
-    ASSERT_TRUE(log_shows("kiv_led_ipc_server_thread")); // every thread runs
+    ASSERT_TRUE(shows("kiv_led_ipc_server_thread")); // every thread runs, and all registrations are sent
+    drain(r.wires);
 
     std::thread first([&] { flood(1, stop, junk); });
     std::thread second([&] { flood(2, stop, junk); });
     std::thread module([&] {
         for (int i = 0; i < notifications; i++)
-            accepted += notify(KIV_MODULE_MAIN, REG_MC_EVENT_POWER_OFF_QUICKEN_ACK);
+            accepted += post(question);
         stop = true;
     });
-    for (bool over = false; !over && answered <= notifications;) {
-        const bool all_sent = stop;
-        if (next_reverser(main_queue, all_sent ? 3000 : 100) == "4104")
-            answered++;
-        else
-            over = all_sent;
+    for (int quiet_ms = 0; quiet_ms < 3000 && answered <= notifications; std::this_thread::sleep_for(1ms)) {
+        const int answers = drain(r.wires);
+        answered += answers;
+        quiet_ms = stop && answers == 0 ? quiet_ms + 1 : 0;
     }
     module.join();
     first.join();
@@ -93,60 +141,60 @@ TEST_F(attack, FloodLosesNoAcceptedNotification)
 TEST_F(attack, NvFileReplacedWhileRead)
 {
     std::atomic<bool> stop = false;
-    const std::string low = "10";
-    const std::string full = "100" + std::string(56, ' ');
+    const std::string texts[] = {"10", "100" + std::string(56, ' ')};
+    std::map<std::string, int> reads;
     write("nv/battery_exist", "1");
-    write("nv/battery_value", low);
+    write("nv/battery_value", texts[0]);
     ASSERT_TRUE(start());
     std::thread writer([&] {
-        for (int i = 0; !stop; i++)
-            write("nv/battery_value", i % 2 == 0 ? full : low);
+        for (int i = 1; !stop; i++)
+            write("nv/battery_value", texts[i % 2]);
     });
-    ASSERT_TRUE(notify(KIV_MODULE_MAIN, REG_MC_EVENT_POWERON));
+    EXPECT_TRUE(post(notification(KIV_MODULE_MAIN, REG_MC_EVENT_POWERON, "")));
     for (int i = 0; i < 1000; i++)
-        ASSERT_TRUE(notify(KIV_MODULE_MAIN, REG_MC_BATTERY_VALUE));
+        EXPECT_TRUE(post(notification(KIV_MODULE_MAIN, REG_MC_BATTERY_VALUE, "")));
     EXPECT_TRUE(answers());
     stop = true;
     writer.join();
 
-    std::istringstream lines(trace());
-    int low_reads = 0;
-    int full_reads = 0;
-    for (std::string line; std::getline(lines, line);) {
-        if (line.find("kiv_nvconfig_read(\"battery_value\"") == std::string::npos)
-            continue;
-        const std::string text = line.substr(line.find("= "));
-        EXPECT_TRUE(text == "= 0, \"" + low + "\"" || text == "= 0, \"" + full + "\"") << line;
-        (text.size() > full.size() ? full_reads : low_reads)++;
+    for (const trace_entry &entry : read_trace(r.trace)) {
+        if (entry.call == "kiv_nvconfig_read" && entry.arguments.starts_with("\"battery_value\""))
+            reads[entry.result]++;
     }
-    EXPECT_GE(low_reads + full_reads, 1000);
-    EXPECT_GT(low_reads, 0);
-    EXPECT_GT(full_reads, 0);
+    const int low = reads["0, \"" + texts[0] + "\""];
+    const int full = reads["0, \"" + texts[1] + "\""];
+    EXPECT_EQ(reads.size(), 2U) << "another text than the two was read";
+    EXPECT_GE(low + full, 1000);
+    EXPECT_GT(low, 0);
+    EXPECT_GT(full, 0);
 }
 
 TEST_F(attack, FullDiskOfTheDeviceDirectory)
 {
     close();
-    if (!open("DRIVER_UFI", "size=256k,mode=0700"))
+    disk = make_device(error);
+    if (mount("tmpfs", disk.c_str(), "tmpfs", 0, "size=256k,mode=0700") != 0)
         GTEST_SKIP() << "only root can mount a small disk";
+    setenv("TMPDIR", disk.c_str(), 1);
+    open("DRIVER_UFI");
     write("nv/battery_exist", "1");
     write("nv/battery_value", "80");
     ASSERT_TRUE(start());
-    ASSERT_TRUE(log_shows("Delete night mode check timer")); // all is up, no LED has been set yet
-    std::ofstream filler(path("filler"), std::ios::binary);
+    ASSERT_TRUE(shows("Delete night mode check timer")); // all is up, no LED has been set yet
+    std::ofstream filler(disk + "/filler", std::ios::binary);
     while (filler.put('x').flush())
         ;
-    ASSERT_TRUE(send_command(KIV_MSG_CMD_LED_NIGHT_MODE_MSG));
-    ASSERT_TRUE(notify(KIV_MODULE_SMS, REG_WMS_SMS_NEW_SMS));
-    ASSERT_TRUE(notify(KIV_MODULE_MAIN, REG_MC_EVENT_POWERON));
+    ASSERT_TRUE(post(command(KIV_MSG_CMD_LED_NIGHT_MODE_MSG)));
+    ASSERT_TRUE(post(notification(KIV_MODULE_SMS, REG_WMS_SMS_NEW_SMS, "")));
+    ASSERT_TRUE(post(notification(KIV_MODULE_MAIN, REG_MC_EVENT_POWERON, "")));
     EXPECT_TRUE(answers());
     EXPECT_NE(trace().find("kiv_nvconfig_write(\"is_night_mode\", \"0\", 1) = -1"), std::string::npos);
-    EXPECT_NE(log().find(" fail:"), std::string::npos) << "a LED that could not be set is not told";
+    EXPECT_NE(trace().find(" fail:"), std::string::npos) << "a LED that could not be set is not told";
 
     filler.close();
-    std::filesystem::remove(path("filler"));
+    std::filesystem::remove(disk + "/filler");
     const size_t before = trace().size();
-    ASSERT_TRUE(notify(KIV_MODULE_MAIN, REG_MC_EVENT_POWERON));
+    ASSERT_TRUE(post(notification(KIV_MODULE_MAIN, REG_MC_EVENT_POWERON, "")));
     EXPECT_TRUE(answers());
     EXPECT_NE(trace().find("kiv_bsp_set_leds_sync(bat_green on 4) = 0", before), std::string::npos);
 }
@@ -154,8 +202,22 @@ TEST_F(attack, FullDiskOfTheDeviceDirectory)
 // KIV_KILLS in the environment makes it longer.
 TEST_F(attack, KilledAnywhereAnswersAfterRestart)
 {
+    const std::string story[] = {
+        command(KIV_MSG_CMD_LED_NIGHT_MODE_MSG),
+        notification(KIV_MODULE_MAIN, REG_MC_EVENT_POWERON, ""),
+        notification(KIV_MODULE_MAIN, REG_MC_BATTERY_VALUE, ""),
+        notification(KIV_MODULE_NWINFO, REG_NWINFO_NETTYPE, ""),
+        notification(KIV_MODULE_SMS, REG_WMS_SMS_NEW_SMS, ""),
+        notification(KIV_MODULE_PPP, REG_PPP_STATUS, "1"),
+        notification(KIV_MODULE_WLAN, REG_WLAN_CURRENT_STATUS, "1"),
+        notification(KIV_MODULE_SLEEP, REG_SLEEP_STATUS_EVENT, "1"),
+        notification(KIV_MODULE_SLEEP, REG_SLEEP_STATUS_EVENT, "0"),
+        notification(KIV_MODULE_MAIN, REG_MC_EVENT_RESETTING, ""),
+        notification(KIV_MODULE_MAIN, REG_MC_EVENT_POWER_OFF_CHARGE, ""),
+    };
     std::minstd_rand random(20240501);
-    const int kills = number_from("KIV_KILLS", 25);
+    const char *longer = std::getenv("KIV_KILLS");
+    const int kills = longer == nullptr ? 25 : std::atoi(longer);
     write("nv/night_mode_switch", "1");
     for (int i = 0; i < kills; i++) {
         const unsigned long sent = random() % (4 * std::size(story));
@@ -164,17 +226,13 @@ TEST_F(attack, KilledAnywhereAnswersAfterRestart)
             launch(); // dies before it is asked to start
         else
             ASSERT_TRUE(start()) << "kill " << i;
-        for (unsigned long at = 0; at < sent; at++) {
-            const story_row &row = story[at % std::size(story)];
-            notify(row.module, row.event, row.text);
-            if (at % 7 == 0)
-                send_command(KIV_MSG_CMD_LED_NIGHT_MODE_MSG);
-        }
+        for (unsigned long at = 0; at < sent; at++)
+            post(story[at % std::size(story)]);
         std::this_thread::sleep_for(pause);
-        kill_daemon();
+        kill_daemon(r.process);
         ASSERT_TRUE(start()) << "after kill " << i;
         ASSERT_TRUE(answers()) << "after kill " << i;
-        kill_daemon();
+        kill_daemon(r.process);
     }
 }
 
@@ -212,17 +270,17 @@ TEST_F(attack, EveryCallOfTheStartFailing)
     for (const fault_row &row : start_faults) {
         SCOPED_TRACE(std::string(row.call) + " " + row.fault);
         close();
-        ASSERT_TRUE(open(row.product));
+        open(row.product);
         write(std::string("faults/") + row.call, row.fault);
         launch();
-        ASSERT_TRUE(log_shows("led init msg success!"));
-        ASSERT_TRUE(send_command(MSG_CMD_SERVICE_REG));
-        ASSERT_TRUE(go());
-        ASSERT_TRUE(log_shows("recive daemon message to start!!!!"));
-        ASSERT_TRUE(send_command(KIV_MSG_CMD_LED_RELIGHT_MSG));
-        EXPECT_TRUE(log_shows(strstr(row.fault, "531") == nullptr ? "Enter kiv_led_handle_relight_msg"
-                                                                  : "LED function disable and not receive message!"));
-        EXPECT_TRUE(row.log == nullptr || log_shows(row.log));
-        EXPECT_TRUE(trace_shows(std::string(row.call) + "(")) << "the call is not made";
+        ASSERT_TRUE(shows("led init msg success!"));
+        ASSERT_TRUE(post(command(MSG_CMD_SERVICE_REG)));
+        ASSERT_TRUE(post(start_record()));
+        ASSERT_TRUE(shows("recive daemon message to start!!!!"));
+        ASSERT_TRUE(post(command(KIV_MSG_CMD_LED_RELIGHT_MSG)));
+        EXPECT_TRUE(shows(strstr(row.fault, "531") == nullptr ? "Enter kiv_led_handle_relight_msg"
+                                                              : "LED function disable and not receive message!"));
+        EXPECT_TRUE(row.log == nullptr || shows(row.log));
+        EXPECT_TRUE(shows(std::string(" ") + row.call + "(")) << "the call is not made";
     }
 }
