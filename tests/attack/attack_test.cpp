@@ -135,7 +135,7 @@ TEST_F(attack, FloodLosesNoAcceptedNotification)
     second.join();
     EXPECT_EQ(answered, accepted);
     EXPECT_GT(accepted, notifications / 2);
-    EXPECT_GT(junk, notifications) << "the flood was none";
+    EXPECT_GT(junk, notifications / 10) << "the flood was none";
 }
 
 TEST_F(attack, NvFileReplacedWhileRead)
