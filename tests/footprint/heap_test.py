@@ -9,7 +9,8 @@ import sys
 import tempfile
 import time
 
-import rig
+sys.path.insert(0, str(pathlib.Path(__file__).resolve().parents[2] / "scripts"))
+import footprint_rig as rig  # noqa: E402
 
 REPORT_SIZE = 16 + 16 * 112
 TR181_WRITES_S = 1.5  # 40 s and ten pauses, a hundred times shorter, and the emulator's own time
