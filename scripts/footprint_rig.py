@@ -4,6 +4,7 @@ import fcntl
 import os
 import pathlib
 import shutil
+import signal
 import socket
 import struct
 import subprocess
@@ -56,7 +57,7 @@ class Rig:
         self.sender.setsockopt(socket.SOL_SOCKET, socket.SO_SNDBUF, 1 << 20)
         own = {"KIV_DEVICE_DIR": str(self.dir), "KIV_LOG": "none", "TZ": "UTC"}
         self.process = subprocess.Popen([*prefix, str(daemon)], env={**os.environ, **own, **(environment or {})},
-                                        stdout=subprocess.DEVNULL, stderr=subprocess.DEVNULL)
+                                        stdout=subprocess.DEVNULL, stderr=subprocess.DEVNULL, start_new_session=True)
         try:
             self._handshake()
         except Exception:
@@ -70,7 +71,7 @@ class Rig:
         self.close()
 
     def close(self):
-        self.process.kill()
+        os.killpg(self.process.pid, signal.SIGKILL)  # strace, killed alone, would let the daemon run on
         self.process.wait()
         shutil.rmtree(self.dir)
 
