@@ -1,34 +1,31 @@
 #include "alarms/kiv_led_data_limit.h"
 
-#include "core/led_ctx.h"
-#include "core/led_log.h"
-#include "core/nv_read.h"
-#include "core/product_route.h"
+#include "ground/led_ctx.h"
+#include "ground/led_log.h"
+#include "ground/nv_read.h"
+#include "ground/timer.h"
 #include "kiv/adabsp.h"
 #include "kiv/ipc.h"
 #include "output/led_groups.h"
-#include "policy/cpe/indicators.h"
-#include "policy/standard/net_led.h"
+#include "painters/net_led.h"
 
+#include <array>
 #include <cstdint>
+#include <cstdio>
 #include <cstdlib>
 #include <string_view>
 
-constexpr char led_log_source[] = "kiv_led_data_limit";
+constexpr char LED_LOG_SOURCE[] = "kiv_led_data_limit";
 
-constexpr int check_period_ms = 5000;
-constexpr int remind_period_ms = 1000;
-constexpr double bytes_per_kib = 1024;
+constexpr int CHECK_PERIOD_MS = 5000;
+constexpr int REMIND_PERIOD_MS = 1000;
+
+// Ticks of the reminder's cycle, a second each; those between show what the one before shows.
+enum remind_phase : int { REMIND_NORMAL = 1, REMIND_DARK = 5, REMIND_BLINK = 6, REMIND_DARK_AGAIN = 7 };
+
+constexpr double BYTES_PER_KIB = 1024;
 
 using limit_text = std::array<char, 128>;
-
-constexpr product_route ppp_route = {
-    .ufi = kiv_led_handle_pppStatus,
-    .data_card = kiv_led_handle_pppStatus,
-    .paper_kite = kiv_led_handle_pppStatus,
-    .module = kiv_cpe_led_handle_pppStatus,
-    .uni_core_cpe = kiv_led_handle_pppStatus,
-};
 
 struct size_unit_row {
     uint64_t code; // behind the underscore of NV "data_volume_limit_size"
@@ -37,30 +34,17 @@ struct size_unit_row {
 
 // Any other code, or none: the size is in bytes.
 constexpr auto size_unit_rows = std::array{
-    size_unit_row{1,       bytes_per_kib *bytes_per_kib                              },
-    size_unit_row{1024,    bytes_per_kib *bytes_per_kib *bytes_per_kib               },
-    size_unit_row{1048576, bytes_per_kib *bytes_per_kib *bytes_per_kib *bytes_per_kib},
+    size_unit_row{1,       BYTES_PER_KIB *BYTES_PER_KIB                              },
+    size_unit_row{1024,    BYTES_PER_KIB *BYTES_PER_KIB *BYTES_PER_KIB               },
+    size_unit_row{1048576, BYTES_PER_KIB *BYTES_PER_KIB *BYTES_PER_KIB *BYTES_PER_KIB},
 };
 
 static led_word data_limit_check_timer; // 0 when none
 static led_word data_remind_timer;
 static led_word data_remind_active; // 1 while the reminder plays
-static led_word data_remind_phase;  // never reset: a new reminder goes on where the last one stopped
+static led_word
+    data_remind_phase; // remind_phase, 0 at first; never reset: a new reminder goes on where the last one stopped
 static char no_argument[] = "";
-
-static bool product_has_reminder()
-{
-    return led_product_type == LED_PRODUCT_UFI || led_product_type == LED_PRODUCT_PAPER_KITE ||
-           led_product_type == LED_PRODUCT_UNI_CORE_CPE;
-}
-
-static void delete_check_timer()
-{
-    if (data_limit_check_timer != 0) {
-        kiv_delete_timer(data_limit_check_timer);
-        data_limit_check_timer = 0;
-    }
-}
 
 static limit_text read_text(const char *key)
 {
@@ -96,104 +80,90 @@ static double bytes_of_unit(uint64_t code)
     return 1;
 }
 
-// SIZE_CODE, such as "4_1024" for 4 GB; without a code SIZE is in bytes.
-static double parse_limit_size(const char *text)
+// NV "data_volume_limit_size" is SIZE_CODE, such as "4_1024" for 4 GB; without a code SIZE is in bytes.
+static double read_limit_in_bytes()
 {
-    char *end = nullptr;
-    const double size = std::strtod(text, &end);
+    double size = 0;
+    unsigned long long code = 0;
 
-    if (end == text || *end != '_') {
-        return size;
+    std::sscanf(read_text("data_volume_limit_size").data(), "%lf_%llu", &size, &code);
+    return size * bytes_of_unit(code);
+}
+
+static double read_limit_in_hours()
+{
+    return std::strtod(read_text("data_volume_limit_size").data(), nullptr);
+}
+
+static int kiv_led_check_data_limit_by_data()
+{
+    const uint64_t sent = read_u64("monthly_tx_bytes");
+    const uint64_t received = read_u64("monthly_rx_bytes");
+
+    return reaches_alert(sent + received, read_limit_in_bytes());
+}
+
+static int kiv_led_check_data_limit_by_time()
+{
+    const uint64_t used = read_u64("monthly_time");
+
+    return reaches_alert(used, read_limit_in_hours() * 60 * 60);
+}
+
+// 1 once the used share reaches the alert level, else 0.
+static int kiv_led_check_data_limit()
+{
+    if (std::string_view(read_text("data_volume_limit_switch").data()) == "0") {
+        return 0;
     }
-    return size * bytes_of_unit(std::strtoull(end + 1, nullptr, 10));
+    const limit_text unit_text = read_text("data_volume_limit_unit");
+    const std::string_view unit = unit_text.data();
+
+    if (unit == "time") {
+        return kiv_led_check_data_limit_by_time();
+    }
+    return unit == "data" ? kiv_led_check_data_limit_by_data() : 0;
 }
 
-void recv_pppStatus(const char *p_data)
+// Four seconds of the normal indication, one dark, one of red blinking, one dark. A stop on the receive thread that
+// comes behind the look at data_remind_active is overtaken: this tick then has the LED once more.
+static void kiv_led_remind_data_limit_proc(void *)
 {
-    LED_ERROR("[info] enter the pppStatus fun p_data:%s\n", p_data);
-    kiv_led_route(ppp_route, kiv_led_text_to_int(p_data) == 1 ? 1 : 0);
-}
-
-void get_pppStatus()
-{
-    const nv_text status = kiv_led_read_nv_text("q6_ppp_status");
-
-    LED_ERROR("q6_ppp_status %s\n", status.data());
-    kiv_led_route(ppp_route, std::string_view(status.data()) == "q6_ppp_connected" ? 1 : 0);
-}
-
-void kiv_led_handle_pppStatus(int ppp)
-{
-    LED_INFO("[info] enter the pppStatus fun p_data:%d\n", ppp);
-    if (led_power_state != POWER_ON) {
-        LED_INFO("enter kiv_led_handle_pppStatus, not power on \n ");
-        led_ppp_state = ppp;
+    LED_INFO("[IN FUNC]:kiv_led_remind_data_limit_proc\n");
+    if (data_remind_active == 0) {
         return;
     }
-    if (cur_led_sleep_status == 1) {
-        LED_INFO("enter kiv_led_handle_pppStatus, sleep mode \n ");
-        led_ppp_state = ppp;
+    const int phase = data_remind_phase;
+    switch (phase) {
+    case REMIND_NORMAL:
+        kiv_set_net_led_state(led_net_type, led_ppp_state);
+        break;
+    case REMIND_DARK:
+    case REMIND_DARK_AGAIN:
         kiv_led_set_net_led_off();
-        delete_check_timer();
-        return;
+        break;
+    case REMIND_BLINK:
+        kiv_led_set_net_led_operation(LED_NET_RED, LED_OP_BLINK, 400, 400, 2);
+        break;
+    default: // the LED stays as it is
+        break;
     }
-    if (ppp != led_ppp_state) {
-        kiv_set_net_led_state(led_net_type, ppp);
-    }
-    led_ppp_state = ppp;
-    if (!product_has_reminder()) {
-        return;
-    }
-    if (ppp == 1) {
-        LED_INFO("[info]PPP connect, start check data remind\n");
-        kiv_led_start_remind_data_limit_check();
-    } else if (ppp == 0) {
-        LED_INFO("[info]PPP disconnect, stop data remind\n");
-        kiv_led_stop_data_limit_remind();
-        delete_check_timer();
-    }
+    data_remind_phase = phase == REMIND_DARK_AGAIN ? REMIND_NORMAL : phase + 1;
 }
 
-void kiv_led_start_remind_data_limit_check()
-{
-    LED_INFO("[IN FUNC]:kiv_led_start_remind_data_limit_check\n");
-    if (data_limit_check_timer == 0) {
-        data_limit_check_timer = kiv_timer(get_dstStatus, no_argument, check_period_ms, 1);
-    }
-}
-
-void kiv_led_stop_remind_data_limit_check()
-{
-    LED_INFO("[IN FUNC]:kiv_led_stop_remind_data_limit_check\n");
-    delete_check_timer();
-}
-
-void kiv_led_start_data_limit_remind()
+// A scene that ends the reminder while the check is on its way here finds none to end: it then plays in the dark, until
+// the call ends or the next scene.
+static void kiv_led_start_data_limit_remind()
 {
     if (data_remind_active == 1) {
         return;
     }
-    data_remind_timer = kiv_timer(kiv_led_remind_data_limit_proc, no_argument, remind_period_ms, 1);
+    kiv_led_start_timer(data_remind_timer, kiv_led_remind_data_limit_proc, no_argument, REMIND_PERIOD_MS);
     data_remind_active = 1;
 }
 
-void kiv_led_stop_data_limit_remind()
-{
-    if (data_remind_active == 0) {
-        return;
-    }
-    kiv_delete_timer(data_remind_timer);
-    data_remind_active = 0;
-    kiv_set_net_led_state(led_net_type, led_ppp_state);
-}
-
-void kiv_led_end_data_limit()
-{
-    kiv_led_stop_data_limit_remind();
-    kiv_led_stop_remind_data_limit_check();
-}
-
-void get_dstStatus(void *)
+// The check, every 5 s on the timer thread.
+static void get_dstStatus(void *)
 {
     std::array<char, 2> text;
     kiv_led_read_nv("data_volume_limit_switch", text);
@@ -204,9 +174,9 @@ void get_dstStatus(void *)
         LED_INFO("get_dstStatus, not power on \n ");
         return;
     }
-    if (cur_led_sleep_status == 1) {
+    if (cur_led_sleep_status == ASLEEP) {
         LED_INFO("get_dstStatus, sleep mode \n ");
-        delete_check_timer();
+        kiv_led_end_data_limit_check();
         return;
     }
     if (limit_switch == "0") {
@@ -226,58 +196,35 @@ void get_dstStatus(void *)
     }
 }
 
-// Four seconds of the normal indication, one dark, one of red blinking, one dark.
-void kiv_led_remind_data_limit_proc(void *)
+void kiv_led_start_remind_data_limit_check()
 {
-    LED_INFO("[IN FUNC]:kiv_led_remind_data_limit_proc\n");
+    LED_INFO("[IN FUNC]:kiv_led_start_remind_data_limit_check\n");
+    kiv_led_start_timer(data_limit_check_timer, get_dstStatus, no_argument, CHECK_PERIOD_MS);
+}
+
+void kiv_led_end_data_limit_check()
+{
+    kiv_led_end_timer(data_limit_check_timer);
+}
+
+static void kiv_led_stop_remind_data_limit_check()
+{
+    LED_INFO("[IN FUNC]:kiv_led_stop_remind_data_limit_check\n");
+    kiv_led_end_data_limit_check();
+}
+
+void kiv_led_stop_data_limit_remind()
+{
     if (data_remind_active == 0) {
         return;
     }
-    const int phase = data_remind_phase;
-    switch (phase) {
-    case 1:
-        kiv_set_net_led_state(led_net_type, led_ppp_state);
-        break;
-    case 5:
-    case 7:
-        kiv_led_set_net_led_off();
-        break;
-    case 6:
-        kiv_led_set_net_led_operation(LED_NET_RED, LED_OP_BLINK, 400, 400, 2);
-        break;
-    default: // the LED stays as it is
-        break;
-    }
-    data_remind_phase = phase == 7 ? 1 : phase + 1;
+    kiv_delete_timer(kiv_led_take_timer(data_remind_timer));
+    data_remind_active = 0;
+    kiv_set_net_led_state(led_net_type, led_ppp_state);
 }
 
-int kiv_led_check_data_limit()
+void kiv_led_end_data_limit()
 {
-    if (std::string_view(read_text("data_volume_limit_switch").data()) == "0") {
-        return 0;
-    }
-    const limit_text unit_text = read_text("data_volume_limit_unit");
-    const std::string_view unit = unit_text.data();
-
-    if (unit == "time") {
-        return kiv_led_check_data_limit_by_time();
-    }
-    return unit == "data" ? kiv_led_check_data_limit_by_data() : 0;
-}
-
-int kiv_led_check_data_limit_by_data()
-{
-    const uint64_t sent = read_u64("monthly_tx_bytes");
-    const uint64_t received = read_u64("monthly_rx_bytes");
-    const double limit = parse_limit_size(read_text("data_volume_limit_size").data());
-
-    return reaches_alert(sent + received, limit);
-}
-
-int kiv_led_check_data_limit_by_time()
-{
-    const uint64_t used = read_u64("monthly_time");
-    const double hours = std::strtod(read_text("data_volume_limit_size").data(), nullptr);
-
-    return reaches_alert(used, hours * 60 * 60);
+    kiv_led_stop_data_limit_remind();
+    kiv_led_stop_remind_data_limit_check();
 }

@@ -28,7 +28,7 @@ constexpr bus_case bus_cases[] = {
     {"wlan",          KIV_MODULE_WLAN,   REG_WLAN_CURRENT_STATUS, "1", 10000},
     {"battery",       KIV_MODULE_MAIN,   REG_MC_BATTERY_VALUE,    "",  4000 },
 };
-constexpr int rounds = 15;
+constexpr int ROUNDS = 15;
 
 static device_run device;
 
@@ -75,8 +75,8 @@ static void compare(benchmark::State &state, sender by, const bus_case &which)
     std::vector<double> ratio;
 
     for ([[maybe_unused]] auto turn : state) {
-        daemon_s.push_back(batch_s(by, led_queue, which));
-        bare_s.push_back(batch_s(by, bare_queue, which));
+        daemon_s.push_back(batch_s(by, LED_QUEUE, which));
+        bare_s.push_back(batch_s(by, BARE_QUEUE, which));
         ratio.push_back(bare_s.back() / daemon_s.back());
         state.SetIterationTime(daemon_s.back());
     }
@@ -95,7 +95,7 @@ int main(int argc, char **argv)
             benchmark::RegisterBenchmark(name.c_str(),
                                          [by, &which](benchmark::State &state) { compare(state, by, which); })
                 ->UseManualTime()
-                ->Iterations(rounds)
+                ->Iterations(ROUNDS)
                 ->Unit(benchmark::kMillisecond);
         }
     }

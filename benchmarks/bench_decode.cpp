@@ -16,8 +16,8 @@
 #include <valgrind/callgrind.h>
 #include <vector>
 
-constexpr int batch = 1000;   // messages between two looks at the clock
-constexpr int counted = 1000; // messages a callgrind dump counts
+constexpr int BATCH = 1000;   // messages between two looks at the clock
+constexpr int COUNTED = 1000; // messages a callgrind dump counts
 using steady = std::chrono::steady_clock;
 
 struct instruction_counts {
@@ -43,7 +43,7 @@ __attribute__((noinline)) static void run_straight(const straight_case &straight
 
 static double ns_per_message(steady::time_point from)
 {
-    return std::chrono::duration<double, std::nano>(steady::now() - from).count() / batch;
+    return std::chrono::duration<double, std::nano>(steady::now() - from).count() / BATCH;
 }
 
 static double median(std::vector<double> &values)
@@ -65,13 +65,13 @@ static void compare(benchmark::State &state, size_t index, instruction_counts co
     settle(which, messages);
     for ([[maybe_unused]] auto turn : state) {
         const auto daemon_from = steady::now();
-        run_daemon(which, messages, batch);
+        run_daemon(which, messages, BATCH);
         daemon_ns.push_back(ns_per_message(daemon_from));
         const auto straight_from = steady::now();
-        run_straight(straight, batch);
+        run_straight(straight, BATCH);
         straight_ns.push_back(ns_per_message(straight_from));
         ratio.push_back(daemon_ns.back() / straight_ns.back());
-        state.SetIterationTime(daemon_ns.back() * batch * 1e-9);
+        state.SetIterationTime(daemon_ns.back() * BATCH * 1e-9);
     }
     state.counters["1_ratio"] = median(ratio);
     state.counters["2_daemon_ns"] = median(daemon_ns);
@@ -95,9 +95,9 @@ static int count_instructions()
         settle(cases[i], messages);
         run_straight(straight_cases()[i], 2); // binds what is bound at the first call
         CALLGRIND_ZERO_STATS;
-        run_daemon(cases[i], messages, counted);
+        run_daemon(cases[i], messages, COUNTED);
         CALLGRIND_DUMP_STATS_AT(names.emplace_back(name + " daemon").c_str());
-        run_straight(straight_cases()[i], counted);
+        run_straight(straight_cases()[i], COUNTED);
         CALLGRIND_DUMP_STATS_AT(names.emplace_back(name + " straight").c_str());
     }
     return EXIT_SUCCESS;
@@ -112,7 +112,7 @@ static std::map<std::string, instruction_counts> read_counts()
     std::string name;
     std::string side;
     for (double count = 0; file >> name >> side >> count;) {
-        (side == "daemon" ? counts[name].daemon : counts[name].straight) = count / counted;
+        (side == "daemon" ? counts[name].daemon : counts[name].straight) = count / COUNTED;
     }
     return counts;
 }

@@ -17,10 +17,10 @@
 
 using steady = std::chrono::steady_clock;
 
-constexpr int turns = 10000;
-constexpr char wifi_brightness[] = "/leds/led:wifi_blue/brightness";
-constexpr char lit = '2';
-constexpr char dark = '0';
+constexpr int TURNS = 10000;
+constexpr char WIFI_BRIGHTNESS[] = "/leds/led:wifi_blue/brightness";
+constexpr char LIT = '2';
+constexpr char DARK = '0';
 
 struct led_watch {
     int changes; // inotify
@@ -49,7 +49,7 @@ static void wait_until_shows(const led_watch &watch, char expected)
     }
 }
 
-// The power-on scene has made the file once the LED is lit.
+// The power-on scene has made the file once the LED is LIT.
 static led_watch watch_led(const std::string &path)
 {
     struct stat info;
@@ -60,7 +60,7 @@ static led_watch watch_led(const std::string &path)
     if (watch.file < 0 || inotify_add_watch(watch.changes, path.c_str(), IN_MODIFY) < 0) {
         give_up(path.c_str());
     }
-    wait_until_shows(watch, lit);
+    wait_until_shows(watch, LIT);
     return watch;
 }
 
@@ -69,10 +69,10 @@ static double led_us(const led_watch &watch, bool on)
     const svc_msg message = notification(KIV_MODULE_WLAN, REG_WLAN_CURRENT_STATUS, on ? "1" : "0");
     const auto from = steady::now();
 
-    if (kiv_send_msg(led_queue, &message, message_length(message)) != 0) {
-        give_up(led_queue);
+    if (kiv_send_msg(LED_QUEUE, &message, message_length(message)) != 0) {
+        give_up(LED_QUEUE);
     }
-    wait_until_shows(watch, on ? lit : dark);
+    wait_until_shows(watch, on ? LIT : DARK);
     return us_since(from);
 }
 
@@ -101,7 +101,7 @@ static double quantile(std::vector<double> &values, double share)
 static void send_to_led_file(benchmark::State &state)
 {
     device_run device = start_device();
-    const led_watch watch = watch_led(device.dir + wifi_brightness);
+    const led_watch watch = watch_led(device.dir + WIFI_BRIGHTNESS);
     DBusConnection *bus = dbus_bus_get(DBUS_BUS_SESSION, nullptr);
     std::vector<double> led;
     std::vector<double> dbus;
@@ -110,7 +110,7 @@ static void send_to_led_file(benchmark::State &state)
         give_up("no D-Bus daemon");
     }
     for ([[maybe_unused]] auto turn : state) {
-        led.push_back(led_us(watch, led.size() % 2 == 1)); // it is lit at first
+        led.push_back(led_us(watch, led.size() % 2 == 1)); // it is LIT at first
         dbus.push_back(dbus_us(bus));
         state.SetIterationTime(led.back() * 1e-6);
     }
@@ -126,6 +126,6 @@ static void send_to_led_file(benchmark::State &state)
     state.counters["5_dbus_us"] = dbus_median;
     state.counters["6_dbus_p99.9_us"] = dbus_tail;
 }
-BENCHMARK(send_to_led_file)->UseManualTime()->Iterations(turns)->Unit(benchmark::kMicrosecond);
+BENCHMARK(send_to_led_file)->UseManualTime()->Iterations(TURNS)->Unit(benchmark::kMicrosecond);
 
 BENCHMARK_MAIN();

@@ -1,5 +1,5 @@
-// Ten million messages through the receive path, over a platform that does nothing: what one costs, and the memory, by
-// the million.
+// Ten MILLION messages through the receive path, over a platform that does nothing: what one costs, and the memory, by
+// the MILLION.
 #include "cases.h"
 #include "null_platform.h"
 
@@ -9,8 +9,8 @@
 #include <ctime>
 #include <vector>
 
-constexpr int millions = 10;
-constexpr int million = 1'000'000;
+constexpr int MILLIONS = 10;
+constexpr int MILLION = 1'000'000;
 
 struct feed {
     std::vector<svc_msg> messages;
@@ -64,10 +64,10 @@ static double million_ns()
 {
     received_message received;
     const double from = cpu_ns();
-    for (int i = 0; i < million; ++i) {
+    for (int i = 0; i < MILLION; ++i) {
         kiv_led_receive_message(received);
     }
-    return (cpu_ns() - from) / million;
+    return (cpu_ns() - from) / MILLION;
 }
 
 static void ten_million_messages(benchmark::State &state)
@@ -80,15 +80,15 @@ static void ten_million_messages(benchmark::State &state)
     rss_kib();
     for ([[maybe_unused]] auto turn : state) {
         kib.push_back(rss_kib());
-        for (int i = 0; i < millions; ++i) {
+        for (int i = 0; i < MILLIONS; ++i) {
             ns.push_back(million_ns());
             kib.push_back(rss_kib());
         }
     }
-    state.counters["1_last_to_first"] = ns[millions - 1] / ns[0];
+    state.counters["1_last_to_first"] = ns[MILLIONS - 1] / ns[0];
     state.counters["2_ns_first"] = ns[0];
-    state.counters["3_ns_fifth"] = ns[millions / 2 - 1];
-    state.counters["4_ns_last"] = ns[millions - 1];
+    state.counters["3_ns_fifth"] = ns[MILLIONS / 2 - 1];
+    state.counters["4_ns_last"] = ns[MILLIONS - 1];
     state.counters["5_rss_before_KiB"] = kib.front();
     state.counters["6_rss_after_KiB"] = kib.back();
 }

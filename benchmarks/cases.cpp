@@ -1,12 +1,12 @@
 #include "cases.h"
 
 #include "kiv/reg.h"
+#include "painters/net_led.h"
 #include "policy/cpe/state.h"
-#include "policy/standard/net_led.h"
 
 #include <cstring>
 
-constexpr int settling_rounds = 4; // even: the next message is the case's first again
+constexpr int SETTLING_ROUNDS = 4; // even: the next message is the case's first again
 
 // Every notification that lights or asks for something. Two are left out because they wait for something else than the
 // platform: the handheld's self-test sleeps 200 ms, the module CPE's power-on starts a shell.
@@ -15,7 +15,7 @@ constexpr std::array cases = {
                .product = LED_PRODUCT_UFI,
                .module = KIV_MODULE_NWINFO,
                .event = REG_NWINFO_NETTYPE,
-               .word = &led_net_type                                                                                                                                                                                                                         },
+               .word = &led_net_type},
     bench_case{.name = "handheld/ppp",
                .product = LED_PRODUCT_UFI,
                .module = KIV_MODULE_PPP,
@@ -26,7 +26,7 @@ constexpr std::array cases = {
                .product = LED_PRODUCT_UFI,
                .module = KIV_MODULE_PPP,
                .event = REG_Q6_PPP_STATUS,
-               .word = &led_ppp_state                                                                                                                                                                                                                    },
+               .word = &led_ppp_state},
     bench_case{.name = "handheld/wlan",
                .product = LED_PRODUCT_UFI,
                .module = KIV_MODULE_WLAN,
@@ -45,7 +45,7 @@ constexpr std::array cases = {
                .event = REG_WLAN_AP_WPS_STATE_CHIP2,
                .payload = "1",
                .payload2 = "0"},
-    bench_case{.name = "handheld/sim",    .product = LED_PRODUCT_UFI,                                     .module = KIV_MODULE_MDM,                                                                          .event = REG_SIM_STATUS                                                                                                                                                                              },
+    bench_case{.name = "handheld/sim", .product = LED_PRODUCT_UFI, .module = KIV_MODULE_MDM, .event = REG_SIM_STATUS},
     bench_case{.name = "handheld/unread-sms",
                .product = LED_PRODUCT_UFI,
                .module = KIV_MODULE_SMS,
@@ -61,7 +61,7 @@ constexpr std::array cases = {
     bench_case{.name = "handheld/another-new-sms",
                .product = LED_PRODUCT_UFI,
                .module = KIV_MODULE_SMS,
-               .event = REG_WMS_SMS_NEW_SMS                                                                                                                                                                              },
+               .event = REG_WMS_SMS_NEW_SMS},
     bench_case{.name = "handheld/sms-store-full",
                .product = LED_PRODUCT_UFI,
                .module = KIV_MODULE_SMS,
@@ -77,11 +77,11 @@ constexpr std::array cases = {
     bench_case{.name = "handheld/charging",
                .product = LED_PRODUCT_UFI,
                .module = KIV_MODULE_MAIN,
-               .event = REG_MC_CHARGIN_STATUS                                                                                                                                                                                 },
+               .event = REG_MC_CHARGIN_STATUS},
     bench_case{.name = "handheld/battery",
                .product = LED_PRODUCT_UFI,
                .module = KIV_MODULE_MAIN,
-               .event = REG_MC_BATTERY_VALUE                                                                                                                                                                 },
+               .event = REG_MC_BATTERY_VALUE},
     bench_case{.name = "handheld/power-on",
                .product = LED_PRODUCT_UFI,
                .module = KIV_MODULE_MAIN,
@@ -140,7 +140,7 @@ constexpr std::array cases = {
                .product = LED_PRODUCT_DATA_CARD,
                .module = KIV_MODULE_NWINFO,
                .event = REG_NWINFO_NETTYPE,
-               .word = &led_net_type                                                                                                                                                                                                                     },
+               .word = &led_net_type},
     bench_case{.name = "data-card/ppp",
                .product = LED_PRODUCT_DATA_CARD,
                .module = KIV_MODULE_PPP,
@@ -151,17 +151,17 @@ constexpr std::array cases = {
                .product = LED_PRODUCT_DATA_CARD,
                .module = KIV_MODULE_PPP,
                .event = REG_Q6_PPP_STATUS,
-               .word = &led_ppp_state                                                                                                                                                                                            },
+               .word = &led_ppp_state},
     bench_case{.name = "data-card/signal",
                .product = LED_PRODUCT_DATA_CARD,
                .module = KIV_MODULE_NWINFO,
                .event = REG_NWINFO_SIG_BAR,
-               .word = &led_signal_level                                                                                                                                                                                                                           },
+               .word = &led_signal_level},
     bench_case{.name = "paper-kite/net-type",
                .product = LED_PRODUCT_PAPER_KITE,
                .module = KIV_MODULE_NWINFO,
                .event = REG_NWINFO_NETTYPE,
-               .word = &led_net_type                                                                                                                                                                                                                             },
+               .word = &led_net_type},
     bench_case{.name = "paper-kite/ppp",
                .product = LED_PRODUCT_PAPER_KITE,
                .module = KIV_MODULE_PPP,
@@ -172,7 +172,7 @@ constexpr std::array cases = {
                .product = LED_PRODUCT_PAPER_KITE,
                .module = KIV_MODULE_PPP,
                .event = REG_Q6_PPP_STATUS,
-               .word = &led_ppp_state                                                                                                                                                                                                                   },
+               .word = &led_ppp_state},
     bench_case{.name = "paper-kite/wlan",
                .product = LED_PRODUCT_PAPER_KITE,
                .module = KIV_MODULE_WLAN,
@@ -195,7 +195,7 @@ constexpr std::array cases = {
                .product = LED_PRODUCT_MODULE,
                .module = KIV_MODULE_NWINFO,
                .event = REG_NWINFO_NETTYPE,
-               .word = &cur_cpe_net_type                                                                                                                                                                                                                   },
+               .word = &cur_cpe_net_type},
     bench_case{.name = "module-cpe/roaming",
                .product = LED_PRODUCT_MODULE,
                .module = KIV_MODULE_NWINFO,
@@ -206,7 +206,7 @@ constexpr std::array cases = {
                .product = LED_PRODUCT_MODULE,
                .module = KIV_MODULE_NWINFO,
                .event = REG_NWINFO_SIG_BAR,
-               .word = &cur_cpe_signal_state                                                                                                                                                                                                             },
+               .word = &cur_cpe_signal_state},
     bench_case{.name = "module-cpe/ppp",
                .product = LED_PRODUCT_MODULE,
                .module = KIV_MODULE_PPP,
@@ -217,7 +217,7 @@ constexpr std::array cases = {
                .product = LED_PRODUCT_MODULE,
                .module = KIV_MODULE_PPP,
                .event = REG_Q6_PPP_STATUS,
-               .word = &cur_cpe_ppp_status                                                                                                                                                                                                    },
+               .word = &cur_cpe_ppp_status},
     bench_case{.name = "module-cpe/voicemail",
                .product = LED_PRODUCT_MODULE,
                .module = KIV_MODULE_SMS,
@@ -234,12 +234,12 @@ constexpr std::array cases = {
                .product = LED_PRODUCT_MODULE,
                .module = KIV_MODULE_MAIN,
                .event = REG_MC_CHARGIN_STATUS,
-               .word = &cur_cpe_battery_status                                                                                                                                                                                                                     },
+               .word = &cur_cpe_battery_status},
     bench_case{.name = "module-cpe/battery",
                .product = LED_PRODUCT_MODULE,
                .module = KIV_MODULE_MAIN,
                .event = REG_MC_BATTERY_VALUE,
-               .word = &cur_cpe_battery_status                                                                                                                                                                                                                  },
+               .word = &cur_cpe_battery_status},
     bench_case{.name = "module-cpe/shutting-down",
                .product = LED_PRODUCT_MODULE,
                .module = KIV_MODULE_MAIN,
@@ -268,7 +268,7 @@ constexpr std::array cases = {
                .product = LED_PRODUCT_UNI_CORE_CPE,
                .module = KIV_MODULE_NWINFO,
                .event = REG_NWINFO_NETTYPE,
-               .word = &led_net_type                                                                                                                                                                                                                 },
+               .word = &led_net_type},
     bench_case{.name = "single-chip-cpe/ppp",
                .product = LED_PRODUCT_UNI_CORE_CPE,
                .module = KIV_MODULE_PPP,
@@ -302,7 +302,7 @@ constexpr std::array cases = {
                .product = LED_PRODUCT_UNI_CORE_CPE,
                .module = KIV_MODULE_NWINFO,
                .event = REG_NWINFO_SIG_BAR,
-               .word = &led_signal_level                                                                                                                                                                                                                  },
+               .word = &led_signal_level},
     bench_case{.name = "single-chip-cpe/voice",
                .product = LED_PRODUCT_UNI_CORE_CPE,
                .module = KIV_MODULE_VOICE,
@@ -349,7 +349,7 @@ constexpr std::array cases = {
                .product = LED_PRODUCT_UNI_CORE_CPE,
                .module = KIV_MODULE_LED,
                .event = 0,
-               .cmd = KIV_MSG_CMD_LED_RELIGHT_MSG                                                                                                                                                                                                                               },
+               .cmd = KIV_MSG_CMD_LED_RELIGHT_MSG},
 };
 
 static received_message message_of(const bench_case &which, const char *payload)
@@ -391,7 +391,7 @@ void settle(const bench_case &which, case_messages &messages)
     messages = {message_of(which, which.payload), message_of(which, second)};
     led_product_type = which.product;
     be_on_and_awake();
-    for (size_t i = 0; i < settling_rounds; ++i) {
+    for (size_t i = 0; i < SETTLING_ROUNDS; ++i) {
         hear(which, messages[i % messages.size()]);
     }
 }

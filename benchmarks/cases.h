@@ -2,7 +2,8 @@
 #pragma once
 
 #include "core/channel.h"
-#include "core/led_ctx.h"
+#include "core/dispatch.h"
+#include "ground/led_ctx.h"
 
 #include <array>
 #include <cstddef>

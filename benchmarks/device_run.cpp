@@ -22,7 +22,7 @@
 
 namespace fs = std::filesystem;
 
-constexpr char in_memory[] = "/dev/shm"; // as on the device, where the files of LEDs reach no disk
+constexpr char IN_MEMORY[] = "/dev/shm"; // as on the device, where the files of LEDs reach no disk
 
 constexpr std::array<std::pair<const char *, const char *>, 8> settings = {
     {{"cfg/531", "1"},
@@ -43,7 +43,7 @@ void give_up(const char *what)
 
 static std::string make_directory()
 {
-    std::string pattern = std::string(in_memory) + "/kiv-bench-XXXXXX";
+    std::string pattern = std::string(IN_MEMORY) + "/kiv-bench-XXXXXX";
     if (mkdtemp(pattern.data()) == nullptr) {
         give_up(pattern.c_str());
     }
@@ -73,8 +73,8 @@ static std::string make_directory()
     int queue = -1;
 
     prctl(PR_SET_PDEATHSIG, SIGKILL);
-    if (kiv_init_msg(bare_queue, &queue) < 0 || write(ready, "", 1) != 1) {
-        give_up(bare_queue);
+    if (kiv_init_msg(BARE_QUEUE, &queue) < 0 || write(ready, "", 1) != 1) {
+        give_up(BARE_QUEUE);
     }
     for (;;) {
         recv(queue, buffer.data(), buffer.size(), 0);
@@ -94,7 +94,7 @@ static pid_t start_bare_receiver()
     }
     close(ready[1]);
     if (pid < 0 || read(ready[0], &byte, 1) != 1) {
-        give_up(bare_queue);
+        give_up(BARE_QUEUE);
     }
     close(ready[0]);
     return pid;
@@ -122,7 +122,7 @@ static pid_t start_daemon()
         become_daemon();
     }
     start.record_type = DAEMON_RECORD_START;
-    if (receive_record(queue) != DAEMON_RECORD_HELLO || kiv_send_msg(led_queue, &start, sizeof start) != 0 ||
+    if (receive_record(queue) != DAEMON_RECORD_HELLO || kiv_send_msg(LED_QUEUE, &start, sizeof start) != 0 ||
         receive_record(queue) != DAEMON_RECORD_REG_COMPLETE) {
         give_up("the daemon does not start");
     }
@@ -143,7 +143,7 @@ device_run start_device()
     device.daemon = start_daemon();
 
     const svc_msg power_on = notification(KIV_MODULE_MAIN, REG_MC_EVENT_POWERON, "");
-    kiv_send_msg(led_queue, &power_on, message_length(power_on));
+    kiv_send_msg(LED_QUEUE, &power_on, message_length(power_on));
     return device;
 }
 

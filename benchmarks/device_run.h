@@ -12,8 +12,8 @@ struct device_run {
     pid_t bare = -1;
 };
 
-constexpr char led_queue[] = "MSG_ID_LED";
-constexpr char bare_queue[] = "MSG_ID_BARE"; // of a process that receives and does nothing else
+constexpr char LED_QUEUE[] = "MSG_ID_LED";
+constexpr char BARE_QUEUE[] = "MSG_ID_BARE"; // of a process that receives and does nothing else
 
 // A handheld, started, registered and switched on, with NV that says what each notification asks for. Exits with a
 // message when it cannot be had.

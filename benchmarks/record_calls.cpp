@@ -7,7 +7,7 @@
 #include <cstdlib>
 #include <string>
 
-constexpr char head[] = R"(#include "straight_calls.h"
+constexpr char HEAD[] = R"(#include "straight_calls.h"
 
 #include "kiv/adabsp.h"
 #include "kiv/ipc.h"
@@ -79,7 +79,7 @@ int main(int argc, char **argv)
         std::fprintf(stderr, "error: record_calls FILE\n");
         return EXIT_FAILURE;
     }
-    std::fprintf(file, "%s%sconstexpr std::array cases = {\n%s};\n\n", head, functions.c_str(), rows.c_str());
+    std::fprintf(file, "%s%sconstexpr std::array cases = {\n%s};\n\n", HEAD, functions.c_str(), rows.c_str());
     std::fprintf(file, "std::span<const straight_case> straight_cases()\n{\n    return cases;\n}\n");
     return std::fclose(file) == 0 ? EXIT_SUCCESS : EXIT_FAILURE;
 }

@@ -1,40 +1,37 @@
 #include "core/channel.h"
 
-#include "alarms/kiv_led_over_temp.h"
 #include "core/dispatch.h"
-#include "core/led_ctx.h"
-#include "core/led_log.h"
+#include "ground/led_ctx.h"
+#include "ground/led_log.h"
 #include "kiv/mem.h"
 #include "kiv/reg.h"
-#include "nightmode/kiv_led_night_mode.h"
-#include "policy/singlechip/relight.h"
 
 #include <array>
 #include <cstring>
 #include <unistd.h>
 
-constexpr char led_log_source[] = "kiv_mirta_led";
-constexpr char led_queue[] = "MSG_ID_LED";
-constexpr char daemon_queue[] = "MSG_ID_DAEMON";
-constexpr char process_name[] = "kiv_mirta_led";
-constexpr unsigned open_retry_s = 1;
-constexpr int receive_failed = -1;
+constexpr char LED_LOG_SOURCE[] = "kiv_mirta_led";
+constexpr char LED_QUEUE[] = "MSG_ID_LED";
+constexpr char DAEMON_QUEUE[] = "MSG_ID_DAEMON";
+constexpr char PROCESS_NAME[] = "kiv_mirta_led";
+constexpr unsigned OPEN_RETRY_S = 1;
+constexpr int RECEIVE_FAILED = -1;
 
 static daemon_record record_of(int32_t record_type)
 {
     daemon_record record = {};
 
     record.record_type = record_type;
-    std::memcpy(record.process_name, process_name, sizeof process_name);
-    std::memcpy(record.queue_name, led_queue, sizeof led_queue);
+    std::memcpy(record.process_name, PROCESS_NAME, sizeof PROCESS_NAME);
+    std::memcpy(record.queue_name, LED_QUEUE, sizeof LED_QUEUE);
     return record;
 }
 
 static void open_queue()
 {
-    while (kiv_init_msg(led_queue, &msg_handle) < 0) {
+    while (kiv_init_msg(LED_QUEUE, &msg_handle) < 0) {
         LED_ERROR("socket error: kiv_init_msg failed!");
-        sleep(open_retry_s);
+        sleep(OPEN_RETRY_S);
     }
     LED_INFO("led init msg success!\n");
 }
@@ -69,11 +66,11 @@ void kiv_led_wait_for_daemon()
 
     LED_INFO("kiv_led_wait_for_daemon start...\n");
     open_queue();
-    if (kiv_send_msg(daemon_queue, &hello, sizeof hello) == -1) {
+    if (kiv_send_msg(DAEMON_QUEUE, &hello, sizeof hello) == -1) {
         LED_ERROR("error: kiv_send_msg failed!\n");
     }
     for (;;) {
-        if (kiv_recv_msg(msg_handle, &message, sizeof message) == receive_failed) {
+        if (kiv_recv_msg(msg_handle, &message, sizeof message) == RECEIVE_FAILED) {
             continue;
         }
         if (message.us_cmd == MSG_CMD_SERVICE_REG) {
@@ -89,7 +86,7 @@ int kiv_led_send_reg_complete()
 {
     const daemon_record record = record_of(DAEMON_RECORD_REG_COMPLETE);
 
-    return kiv_send_msg(daemon_queue, &record, sizeof record);
+    return kiv_send_msg(DAEMON_QUEUE, &record, sizeof record);
 }
 
 void *kiv_led_socket_server_thread(void *)
@@ -104,7 +101,7 @@ void *kiv_led_socket_server_thread(void *)
 void kiv_led_receive_message(received_message &received)
 {
     received = {};
-    if (kiv_recv_msg(msg_handle, &received.message, sizeof received.message) == receive_failed) {
+    if (kiv_recv_msg(msg_handle, &received.message, sizeof received.message) == RECEIVE_FAILED) {
         return;
     }
     if (led_enable == 0) {
@@ -112,45 +109,4 @@ void kiv_led_receive_message(received_message &received)
         return;
     }
     messageParse(&received.message);
-}
-
-void messageParse(const svc_msg *msg)
-{
-    LED_INFO("[info] enter messageParse fun\n");
-    if (msg == nullptr) {
-        LED_ERROR("messageParse pointer NULL");
-        return;
-    }
-    if (msg->us_dest_module_id != KIV_MODULE_LED) {
-        LED_ERROR("messageParse us_dest_module_id is not KIV_MODULE_LED");
-        return;
-    }
-    LED_INFO("recv_msg.us_source_module_id is %d", msg->us_source_module_id);
-    LED_INFO("recv_msg.us_cmd is %d", msg->us_cmd);
-    switch (msg->us_cmd) {
-    case KIV_MSG_CMD_LED_CPE_CIRCLE_LED_CTRL:
-        LED_INFO("[info] msg KIV_MSG_CMD_LED_CPE_CIRCLE_LED_CTRL \n");
-        break;
-    case KIV_MSG_CMD_LED_CPE_DATA_LIMIT_MSG:
-        LED_INFO("[info] msg KIV_MSG_CMD_LED_CPE_DATA_LIMIT_MSG \n");
-        break;
-    case KIV_MSG_CMD_LED_CPE_RESET_MSG:
-        LED_INFO("[info] msg KIV_MSG_CMD_LED_CPE_RESET_MSG \n");
-        break;
-    case KIV_MSG_CMD_LED_OVER_TEMP_MSG:
-        kiv_led_over_temp_init();
-        break;
-    case KIV_MSG_CMD_LED_NIGHT_MODE_MSG:
-        kiv_led_night_mode_init();
-        break;
-    case KIV_MSG_CMD_LED_RELIGHT_MSG:
-        kiv_led_handle_relight_msg();
-        break;
-    case MSG_CMD_SERVICE_NOTIFY:
-        LED_INFO("[info] msg MSG_CMD_SERVICE_NOTIFY \n");
-        regDecodeMsg(msg);
-        break;
-    default: // another daemon's command, or a registration request that comes too late
-        break;
-    }
 }

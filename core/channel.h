@@ -19,8 +19,6 @@ int kiv_led_send_reg_complete();
 // Body of the receive thread: handles one message to the end before it takes the next. Never returns.
 void *kiv_led_socket_server_thread(void *unused);
 
-// One turn of the receive thread: waits for a message and handles it, or drops it while the LED function is off.
+// One turn of the receive thread: waits for a message and handles it, or drops it while the LED function is off. The
+// thread takes turns for ever; who drives the daemon without its threads takes them one by one.
 void kiv_led_receive_message(received_message &received);
-
-// Handles one message by its command. A null pointer and a message for another module are refused. Receive thread.
-void messageParse(const svc_msg *msg);

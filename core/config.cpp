@@ -1,38 +1,38 @@
 #include "core/config.h"
 
-#include "core/led_ctx.h"
-#include "core/led_log.h"
+#include "ground/led_ctx.h"
+#include "ground/led_log.h"
 #include "kiv/cfg.h"
 
-#include <array>
 #include <cstdint>
 #include <string_view>
 
-constexpr char led_log_source[] = "kiv_mirta_led";
-constexpr int cfg_failure = -1; // any other result is success
+constexpr char LED_LOG_SOURCE[] = "kiv_mirta_led";
+constexpr int CFG_FAILURE = -1; // any other result is success
 
-struct product_type_row {
-    std::string_view text;
-    led_product product;
-};
-
-// Any other text leaves the product as it is.
-constexpr auto product_type_rows = std::array{
-    product_type_row{"ONLY_DATA_CARD",      LED_PRODUCT_DATA_CARD   },
-    product_type_row{"NO_DRIVER_DATA_CARD", LED_PRODUCT_DATA_CARD   },
-    product_type_row{"DRIVER_DATA_CARD",    LED_PRODUCT_DATA_CARD   },
-    product_type_row{"NO_DRIVER_UFI",       LED_PRODUCT_UFI         },
-    product_type_row{"DRIVER_UFI",          LED_PRODUCT_UFI         },
-    product_type_row{"MODULE",              LED_PRODUCT_MODULE      },
-    product_type_row{"PAPER_KITE",          LED_PRODUCT_PAPER_KITE  },
-    product_type_row{"UNI_CORE_CPE",        LED_PRODUCT_UNI_CORE_CPE},
-};
+// Whether configuration item 6000 names the product by this text.
+static bool is_named(led_product product, std::string_view text)
+{
+    switch (product) {
+    case LED_PRODUCT_UFI:
+        return text == "NO_DRIVER_UFI" || text == "DRIVER_UFI";
+    case LED_PRODUCT_DATA_CARD:
+        return text == "ONLY_DATA_CARD" || text == "NO_DRIVER_DATA_CARD" || text == "DRIVER_DATA_CARD";
+    case LED_PRODUCT_PAPER_KITE:
+        return text == "PAPER_KITE";
+    case LED_PRODUCT_MODULE:
+        return text == "MODULE";
+    case LED_PRODUCT_UNI_CORE_CPE:
+        return text == "UNI_CORE_CPE";
+    }
+    return false;
+}
 
 static void read_led_enable()
 {
     uint8_t enable = 0;
 
-    if (kiv_cfg_get_item(KIV_CFG_9X15_LED_ID, &enable, sizeof enable) == cfg_failure) {
+    if (kiv_cfg_get_item(KIV_CFG_9X15_LED_ID, &enable, sizeof enable) == CFG_FAILURE) {
         LED_ERROR("get KIV_CFG_9X15_LED_ID error!!!\n");
         return;
     }
@@ -43,18 +43,18 @@ static void read_led_enable()
     }
 }
 
+// A text that names none leaves the product as it is.
 static void read_product_type()
 {
-    if (kiv_cfg_get_item(KIV_CFG_PRODUCT_TYPE_ID, product_type_str, sizeof product_type_str) == cfg_failure) {
+    if (kiv_cfg_get_item(KIV_CFG_PRODUCT_TYPE_ID, product_type_str, sizeof product_type_str) == CFG_FAILURE) {
         LED_ERROR("get KIV_CFG_PRODUCT_TYPE_ID error!!!\n");
         return;
     }
     product_type_str[sizeof product_type_str - 1] = '\0';
     LED_INFO("get modem type cfg success: %s\n", product_type_str);
-    for (const product_type_row &row : product_type_rows) {
-        if (row.text == product_type_str) {
-            led_product_type = row.product;
-            return;
+    for (int product = 0; product < LED_PRODUCT_COUNT; ++product) {
+        if (is_named(static_cast<led_product>(product), product_type_str)) {
+            led_product_type = product;
         }
     }
 }

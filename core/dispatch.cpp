@@ -1,269 +1,241 @@
 #include "core/dispatch.h"
 
-#include "alarms/kiv_led_data_limit.h"
-#include "core/led_ctx.h"
-#include "core/led_log.h"
-#include "core/nv_read.h"
+#include "ground/led_ctx.h"
+#include "ground/led_log.h"
+#include "ground/nv_read.h"
 #include "kiv/reg.h"
-#include "policy/cpe/scenes.h"
-#include "policy/singlechip/scenes.h"
-#include "policy/standard/network.h"
-#include "policy/standard/scenes.h"
-#include "policy/standard/sms.h"
-#include "policy/standard/voice.h"
-#include "policy/standard/wifi.h"
+#include "nightmode/kiv_led_night_mode.h"
+#include "policy/common/data_call.h"
+#include "policy/common/network.h"
+#include "policy/common/voice.h"
+#include "policy/products.h"
 
-#include <array>
+constexpr char LED_LOG_SOURCE[] = "kiv_mirta_led";
 
-constexpr char led_log_source[] = "kiv_mirta_led";
+// The events of each module. An event is compared whole, so that two events in one notification are none that is known.
 
-struct product_policy {
-    void (*mc_event)(uint32_t) = nullptr; // nullptr: the product does not hear it
-    void (*sleep_status)(int) = nullptr;
-    void (*wlan_status)(const char *) = nullptr;
-    void (*wps_status)(const char *) = nullptr;
-};
-
-constexpr product_policy ufi_policy = {
-    .mc_event = kiv_led_handle_mc_event,
-    .sleep_status = kiv_led_set_led_when_sleep_status_change,
-    .wlan_status = kiv_led_set_led_wifi_status,
-    .wps_status = kiv_led_set_led_wps_status,
-};
-constexpr product_policy paper_kite_policy = {
-    .wlan_status = kiv_led_set_led_wifi_status,
-    .wps_status = kiv_led_set_led_wps_status,
-};
-constexpr product_policy module_policy = {
-    .mc_event = kiv_cpe_led_handle_mc_event,
-    .sleep_status = kiv_cpe_led_set_led_when_sleep_status_change,
-};
-constexpr product_policy uni_core_cpe_policy = {
-    .mc_event = kiv_singlechip_led_handle_mc_event,
-    .sleep_status = kiv_singlechip_led_handle_sleep_status_change,
-    .wlan_status = kiv_led_set_led_wifi_status,
-    .wps_status = kiv_led_set_led_wps_status,
-};
-constexpr product_policy data_card_policy = {};
-
-static const product_policy &policy_of_this_product()
+static void take_modem_event(uint32_t event)
 {
-    switch (static_cast<led_product>(int{led_product_type})) {
-    case LED_PRODUCT_UFI:
-        return ufi_policy;
-    case LED_PRODUCT_PAPER_KITE:
-        return paper_kite_policy;
-    case LED_PRODUCT_MODULE:
-        return module_policy;
-    case LED_PRODUCT_UNI_CORE_CPE:
-        return uni_core_cpe_policy;
-    case LED_PRODUCT_DATA_CARD:
-    case LED_PRODUCT_COUNT:
+    switch (event) {
+    case REG_SIM_STATUS:
+        LED_INFO("recv REG_SIM_STATUS\n");
+        recv_simStatus();
+        break;
+    default:
         break;
     }
-    return data_card_policy;
+}
+
+static void take_network_event(uint32_t event)
+{
+    switch (event) {
+    case REG_NWINFO_ROAMING_STATUS:
+        LED_INFO("recv  REG_NWINFO_ROAMING_STATUS \n");
+        recv_nwRoamStatus();
+        break;
+    case REG_NWINFO_NETTYPE:
+        LED_INFO("recv  REG_NWINFO_NETTYPE \n");
+        recv_nwNetType();
+        break;
+    case REG_NWINFO_SIG_BAR:
+        LED_INFO("recv  REG_NWINFO_SIG_BAR \n");
+        recv_nwSigStatus();
+        break;
+    default:
+        break;
+    }
+}
+
+static void take_data_call_event(uint32_t event, const char *p_data)
+{
+    switch (event) {
+    case REG_PPP_STATUS:
+        LED_INFO("recv REG_PPP_STATUS p_data=%s\n", p_data);
+        recv_pppStatus(p_data);
+        break;
+    case REG_Q6_PPP_STATUS:
+        LED_INFO("recv REG_Q6_PPP_STATUS p_data=%s\n", p_data);
+        get_pppStatus();
+        break;
+    default:
+        break;
+    }
 }
 
 static bool passes_wifi_guard(const char *subject)
 {
-    if (led_power_state == POWER_ON && cur_led_sleep_status == 0) {
+    if (led_power_state == POWER_ON && cur_led_sleep_status == AWAKE) {
         return true;
     }
     LED_INFO("not power on or wakeup, ignore %s message\n", subject);
     return false;
 }
 
-static void on_sim(const char *)
+static void take_wifi_event(uint32_t event, const char *p_data)
 {
-    recv_simStatus();
+    switch (event) {
+    case REG_WLAN_AP_WPS_STATE:
+    case REG_WLAN_AP_WPS_STATE_CHIP2:
+        if (passes_wifi_guard("WPS")) {
+            LED_INFO("recv REG_WLAN_AP_WPS_STATE p_data=%s\n", p_data);
+            kiv_led_wps_status_dispatch(p_data);
+        }
+        break;
+    case REG_WLAN_CURRENT_STATUS:
+        if (passes_wifi_guard("WLAN")) {
+            LED_INFO(" recv REG_WLAN_CURRENT_STATUS wifi status= p_data=%s\n", p_data);
+            kiv_led_wlan_status_dispatch(p_data);
+        }
+        break;
+    default:
+        break;
+    }
 }
 
-static void on_roaming(const char *)
+static void take_sms_event(uint32_t event, const char *p_data)
 {
-    recv_nwRoamStatus();
+    switch (event) {
+    case REG_WMS_SMS_NV_UNREAD_SMS:
+    case REG_WMS_SMS_NEW_SMS:
+    case REG_WMS_SMS_MEMORY_FULL:
+        kiv_led_sms_dispatch(event);
+        break;
+    case REG_WMS_SMS_VOCEMAIL_SET_FLAG:
+        LED_INFO("recv REG_WMS_SMS_VOCEMAIL_SET_FLAG: %s\n", p_data);
+        recv_VoiceMailStatus(p_data);
+        break;
+    default:
+        break;
+    }
 }
 
-static void on_net_type(const char *)
+// The product's sleep handler settles what is stored here.
+static void take_sleep_status(int sleep_status)
 {
-    recv_nwNetType();
-}
-
-static void on_signal(const char *)
-{
-    recv_nwSigStatus();
-}
-
-static void on_q6_ppp(const char *)
-{
-    get_pppStatus();
-}
-
-static void on_unread_sms(const char *)
-{
-    recv_SMSstatus(REG_WMS_SMS_NV_UNREAD_SMS);
-}
-
-static void on_new_sms(const char *)
-{
-    recv_SMSstatus(REG_WMS_SMS_NEW_SMS);
-}
-
-static void on_sms_store_full(const char *)
-{
-    recv_SMSstatus(REG_WMS_SMS_MEMORY_FULL);
-}
-
-// The sleep handler settles what is stored here.
-static void on_sleep(const char *p_data)
-{
-    const int sleep_status = kiv_led_text_to_int(p_data);
-
     cur_led_sleep_status = sleep_status;
     kiv_led_sleep_status_dispatch(sleep_status);
 }
 
-struct source_row {
-    uint16_t module;
-    const char *line;
-    void (*any_event)(uint32_t); // nullptr: the events are in notification_rows
-};
-
-constexpr auto source_rows = std::array{
-    source_row{KIV_MODULE_MAIN,   "[info] source msg KIV_MODULE_MAIN\n",   kiv_led_mc_event_dispatch},
-    source_row{KIV_MODULE_MDM,    "[info] source msg KIV_MODULE_MDM\n",    nullptr                  },
-    source_row{KIV_MODULE_NWINFO, "[info] source msg KIV_MODULE_NWINFO\n", nullptr                  },
-    source_row{KIV_MODULE_PPP,    "[info] source msg KIV_MODULE_PPP\n",    nullptr                  },
-    source_row{KIV_MODULE_WLAN,   "[info] source msg KIV_MODULE_WLAN\n",   nullptr                  },
-    source_row{KIV_MODULE_SMS,    "[info] source msg KIV_MODULE_SMS\n",    nullptr                  },
-    source_row{KIV_MODULE_SLEEP,  "[info] source msg KIV_MODULE_SLEEP\n",  nullptr                  },
-    source_row{KIV_MODULE_DST,    "[info] source msg KIV_MODULE_DST\n",    nullptr                  },
-    source_row{KIV_MODULE_VOICE,  "[info] source msg KIV_MODULE_VOICE\n",  nullptr                  },
-};
-
-struct notification_row {
-    uint16_t module;
-    uint32_t event;                // compared whole: two events in one notification match no row
-    const char *line;              // nullptr: none
-    bool logs_payload;             // the payload and a newline follow the line
-    void (*handle)(const char *);  // gets the payload; nullptr: only logged
-    const char *guarded = nullptr; // dropped under this name unless on and awake
-};
-
-// clang-format off
-constexpr auto notification_rows = std::array{
-    notification_row{KIV_MODULE_MDM, REG_SIM_STATUS, "recv REG_SIM_STATUS\n", false, on_sim},
-    notification_row{KIV_MODULE_NWINFO, REG_NWINFO_ROAMING_STATUS, "recv  REG_NWINFO_ROAMING_STATUS \n", false,
-                     on_roaming},
-    notification_row{KIV_MODULE_NWINFO, REG_NWINFO_NETTYPE, "recv  REG_NWINFO_NETTYPE \n", false, on_net_type},
-    notification_row{KIV_MODULE_NWINFO, REG_NWINFO_SIG_BAR, "recv  REG_NWINFO_SIG_BAR \n", false, on_signal},
-    notification_row{KIV_MODULE_PPP, REG_PPP_STATUS, "recv REG_PPP_STATUS p_data=", true, recv_pppStatus},
-    notification_row{KIV_MODULE_PPP, REG_Q6_PPP_STATUS, "recv REG_Q6_PPP_STATUS p_data=", true, on_q6_ppp},
-    notification_row{KIV_MODULE_WLAN, REG_WLAN_AP_WPS_STATE, "recv REG_WLAN_AP_WPS_STATE p_data=", true,
-                     kiv_led_wps_status_dispatch, "WPS"},
-    notification_row{KIV_MODULE_WLAN, REG_WLAN_AP_WPS_STATE_CHIP2, "recv REG_WLAN_AP_WPS_STATE p_data=", true,
-                     kiv_led_wps_status_dispatch, "WPS"},
-    notification_row{KIV_MODULE_WLAN, REG_WLAN_CURRENT_STATUS, " recv REG_WLAN_CURRENT_STATUS wifi status= p_data=",
-                     true, kiv_led_wlan_status_dispatch, "WLAN"},
-    notification_row{KIV_MODULE_SMS, REG_WMS_SMS_NV_UNREAD_SMS, nullptr, false, on_unread_sms},
-    notification_row{KIV_MODULE_SMS, REG_WMS_SMS_NEW_SMS, nullptr, false, on_new_sms},
-    notification_row{KIV_MODULE_SMS, REG_WMS_SMS_MEMORY_FULL, nullptr, false, on_sms_store_full},
-    notification_row{KIV_MODULE_SMS, REG_WMS_SMS_VOCEMAIL_SET_FLAG, "recv REG_WMS_SMS_VOCEMAIL_SET_FLAG: ", true,
-                     recv_VoiceMailStatus},
-    notification_row{KIV_MODULE_SLEEP, REG_SLEEP_STATUS_EVENT, "recv REG_SLEEP_STATUS_EVENT p_data=", true, on_sleep},
-    notification_row{KIV_MODULE_DST, REG_DST_FLOW_STATUS, "recv REG_DST_FLOW_STATUS p_data=", true, nullptr},
-    notification_row{KIV_MODULE_VOICE, REG_VOICE_PHONE_LED_STATE, "recv REG_VOICE_PHONE_LED_STATE p_data=", true,
-                     recv_voicePhoneStatus},
-};
-// clang-format on
-
-static const source_row *find_source(uint16_t module)
+static void take_sleep_event(uint32_t event, const char *p_data)
 {
-    for (const source_row &row : source_rows) {
-        if (row.module == module) {
-            return &row;
-        }
-    }
-    return nullptr;
-}
-
-static const notification_row *find_notification(uint16_t module, uint32_t event)
-{
-    for (const notification_row &row : notification_rows) {
-        if (row.module == module && row.event == event) {
-            return &row;
-        }
-    }
-    return nullptr;
-}
-
-static void take_notification(const notification_row &row, const char *p_data)
-{
-    if (row.guarded != nullptr && !passes_wifi_guard(row.guarded)) {
-        return;
-    }
-    if (row.logs_payload) {
-        LED_INFO("%s%s\n", row.line, p_data);
-    } else if (row.line != nullptr) {
-        LED_INFO("%s", row.line);
-    }
-    if (row.handle != nullptr) {
-        row.handle(p_data);
+    switch (event) {
+    case REG_SLEEP_STATUS_EVENT:
+        LED_INFO("recv REG_SLEEP_STATUS_EVENT p_data=%s\n", p_data);
+        take_sleep_status(kiv_led_text_to_int(p_data));
+        break;
+    default:
+        break;
     }
 }
 
-void regDecodeMsg(const svc_msg *msg)
+static void take_usage_event(uint32_t event, const char *p_data)
+{
+    switch (event) {
+    case REG_DST_FLOW_STATUS: // the reminder looks at the counters by itself
+        LED_INFO("recv REG_DST_FLOW_STATUS p_data=%s\n", p_data);
+        break;
+    default:
+        break;
+    }
+}
+
+static void take_voice_event(uint32_t event, const char *p_data)
+{
+    switch (event) {
+    case REG_VOICE_PHONE_LED_STATE:
+        LED_INFO("recv REG_VOICE_PHONE_LED_STATE p_data=%s\n", p_data);
+        recv_voicePhoneStatus(p_data);
+        break;
+    default:
+        break;
+    }
+}
+
+static void regDecodeMsg(const svc_msg *msg)
 {
     const uint32_t event = msg->ul_event_mask;
+    const char *p_data = msg->p_data;
 
     LED_INFO("regDecodeMsg source_id %d, mask1 %d", msg->us_source_module_id, static_cast<int>(event));
+    switch (msg->us_source_module_id) {
+    case KIV_MODULE_MAIN:
+        LED_INFO("[info] source msg KIV_MODULE_MAIN\n");
+        kiv_led_mc_event_dispatch(event);
+        break;
+    case KIV_MODULE_MDM:
+        LED_INFO("[info] source msg KIV_MODULE_MDM\n");
+        take_modem_event(event);
+        break;
+    case KIV_MODULE_NWINFO:
+        LED_INFO("[info] source msg KIV_MODULE_NWINFO\n");
+        take_network_event(event);
+        break;
+    case KIV_MODULE_PPP:
+        LED_INFO("[info] source msg KIV_MODULE_PPP\n");
+        take_data_call_event(event, p_data);
+        break;
+    case KIV_MODULE_WLAN:
+        LED_INFO("[info] source msg KIV_MODULE_WLAN\n");
+        take_wifi_event(event, p_data);
+        break;
+    case KIV_MODULE_SMS:
+        LED_INFO("[info] source msg KIV_MODULE_SMS\n");
+        take_sms_event(event, p_data);
+        break;
+    case KIV_MODULE_SLEEP:
+        LED_INFO("[info] source msg KIV_MODULE_SLEEP\n");
+        take_sleep_event(event, p_data);
+        break;
+    case KIV_MODULE_DST:
+        LED_INFO("[info] source msg KIV_MODULE_DST\n");
+        take_usage_event(event, p_data);
+        break;
+    case KIV_MODULE_VOICE:
+        LED_INFO("[info] source msg KIV_MODULE_VOICE\n");
+        take_voice_event(event, p_data);
+        break;
+    default:
+        break;
+    }
+}
 
-    const source_row *source = find_source(msg->us_source_module_id);
-    if (source == nullptr) {
+void messageParse(const svc_msg *msg)
+{
+    LED_INFO("[info] enter messageParse fun\n");
+    if (msg == nullptr) {
+        LED_ERROR("messageParse pointer NULL");
         return;
     }
-    LED_INFO("%s", source->line);
-    if (source->any_event != nullptr) {
-        source->any_event(event);
+    if (msg->us_dest_module_id != KIV_MODULE_LED) {
+        LED_ERROR("messageParse us_dest_module_id is not KIV_MODULE_LED");
         return;
     }
-    const notification_row *notification = find_notification(source->module, event);
-    if (notification != nullptr) {
-        take_notification(*notification, msg->p_data);
-    }
-}
-
-void kiv_led_mc_event_dispatch(uint32_t event)
-{
-    const product_policy &policy = policy_of_this_product();
-
-    if (policy.mc_event != nullptr) {
-        policy.mc_event(event);
-    }
-}
-
-void kiv_led_sleep_status_dispatch(int sleep_status)
-{
-    const product_policy &policy = policy_of_this_product();
-
-    if (policy.sleep_status != nullptr) {
-        policy.sleep_status(sleep_status);
-    }
-}
-
-void kiv_led_wlan_status_dispatch(const char *p_data)
-{
-    const product_policy &policy = policy_of_this_product();
-
-    if (policy.wlan_status != nullptr) {
-        policy.wlan_status(p_data);
-    }
-}
-
-void kiv_led_wps_status_dispatch(const char *p_data)
-{
-    const product_policy &policy = policy_of_this_product();
-
-    if (policy.wps_status != nullptr) {
-        policy.wps_status(p_data);
+    LED_INFO("recv_msg.us_source_module_id is %d", msg->us_source_module_id);
+    LED_INFO("recv_msg.us_cmd is %d", msg->us_cmd);
+    switch (msg->us_cmd) {
+    case KIV_MSG_CMD_LED_CPE_CIRCLE_LED_CTRL:
+        LED_INFO("[info] msg KIV_MSG_CMD_LED_CPE_CIRCLE_LED_CTRL \n");
+        break;
+    case KIV_MSG_CMD_LED_CPE_DATA_LIMIT_MSG:
+        LED_INFO("[info] msg KIV_MSG_CMD_LED_CPE_DATA_LIMIT_MSG \n");
+        break;
+    case KIV_MSG_CMD_LED_CPE_RESET_MSG:
+        LED_INFO("[info] msg KIV_MSG_CMD_LED_CPE_RESET_MSG \n");
+        break;
+    case KIV_MSG_CMD_LED_OVER_TEMP_MSG:
+        kiv_led_over_temp_dispatch();
+        break;
+    case KIV_MSG_CMD_LED_NIGHT_MODE_MSG:
+        kiv_led_night_mode_init();
+        break;
+    case KIV_MSG_CMD_LED_RELIGHT_MSG:
+        kiv_led_relight_dispatch();
+        break;
+    case MSG_CMD_SERVICE_NOTIFY:
+        LED_INFO("[info] msg MSG_CMD_SERVICE_NOTIFY \n");
+        regDecodeMsg(msg);
+        break;
+    default: // also a registration request that comes too late
+        break;
     }
 }

@@ -1,16 +1,8 @@
-// Notifications of the other modules: decoding them, and which product hears what.
+// What a received message sets off: the command switch, and the decoding of the other modules' notifications.
 #pragma once
 
 #include "kiv/socket.h"
 
-#include <cstdint>
-
-// Handles one notification (MSG_CMD_SERVICE_NOTIFY). p_data is terminated, at the latest by the byte behind the
-// message. Receive thread.
-void regDecodeMsg(const svc_msg *msg);
-
-// Variant selectors: hand the value to the product's handler, or drop it. Receive thread.
-void kiv_led_mc_event_dispatch(uint32_t event);
-void kiv_led_sleep_status_dispatch(int sleep_status);
-void kiv_led_wlan_status_dispatch(const char *p_data);
-void kiv_led_wps_status_dispatch(const char *p_data);
+// Handles one message by its command. A null pointer and a message for another module are refused. p_data is
+// terminated, at the latest by the byte behind the message. Receive thread.
+void messageParse(const svc_msg *msg);

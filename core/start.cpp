@@ -1,25 +1,24 @@
 #include "core/start.h"
 
-#include "alarms/kiv_led_over_temp.h"
 #include "core/bsp_ind.h"
-#include "core/bsp_ready.h"
 #include "core/channel.h"
 #include "core/config.h"
-#include "core/led_ctx.h"
-#include "core/led_log.h"
 #include "core/registration.h"
+#include "ground/led_ctx.h"
+#include "ground/led_log.h"
+#include "ground/rolling_leds.h"
 #include "kiv/ipc.h"
 #include "kiv/nv.h"
 #include "kiv/reg.h"
 #include "nightmode/kiv_led_night_mode.h"
 #include "nightmode/kiv_led_tr181.h"
-#include "policy/initial_scenes.h"
+#include "policy/products.h"
 
 #include <pthread.h>
 
-constexpr char led_log_source[] = "kiv_mirta_led";
+constexpr char LED_LOG_SOURCE[] = "kiv_mirta_led";
 
-// Threads live as long as the process: none is joined or detached.
+// None is joined or detached: the TR-181 thread ends by itself, the others live as long as the process.
 static bool create_thread(void *(*body)(void *))
 {
     pthread_t thread;
@@ -30,7 +29,7 @@ static bool create_thread(void *(*body)(void *))
 static void register_and_init()
 {
     LED_ERROR("LED enable,  reg and init!\n");
-    kiv_ipc_init(led_log_id, 0);
+    kiv_ipc_init(LED_LOG_ID, 0);
     kiv_led_regNotifyMsg();
     kiv_led_register_bsp_ind();
     if (led_bsp_ready == 1) {
@@ -51,6 +50,10 @@ static bool create_working_threads()
     return true;
 }
 
+// The handshake comes before the configuration: the system daemon waits for it also where the LED function is off. What
+// the daemon registers for and shows at first is settled before another thread runs, and the system daemon hears that
+// registration is complete only when somebody receives. The alarm and night mode come last, beside the receive thread:
+// their first look may relight, which is a message to this very daemon.
 int kiv_led_start()
 {
     LED_ERROR("***************kiv_mirta_led start!***************\n");
@@ -70,7 +73,7 @@ int kiv_led_start()
     if (!create_thread(kiv_tr181_led_init)) {
         LED_ERROR("Create kiv_tr181_led_init thread failed\n");
     }
-    kiv_led_over_temp_init();
+    kiv_led_over_temp_dispatch();
     kiv_nvconfig_write("is_night_mode", "0", 1);
     kiv_led_night_mode_init();
     return 0;

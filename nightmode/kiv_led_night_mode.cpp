@@ -1,12 +1,13 @@
 #include "nightmode/kiv_led_night_mode.h"
 
-#include "core/led_ctx.h"
-#include "core/led_log.h"
-#include "core/nv_read.h"
+#include "ground/led_ctx.h"
+#include "ground/led_log.h"
+#include "ground/nv_read.h"
+#include "ground/timer.h"
 #include "kiv/ipc.h"
 #include "kiv/led.h"
 #include "kiv/nv.h"
-#include "policy/standard/net_led.h"
+#include "painters/net_led.h"
 
 #include <cstdio>
 #include <cstring>
@@ -14,11 +15,11 @@
 #include <pthread.h>
 #include <string_view>
 
-constexpr char led_log_source[] = "kiv_led_night_mode";
+constexpr char LED_LOG_SOURCE[] = "kiv_led_night_mode";
 
-constexpr int check_period_ms = 20000;
-constexpr int minutes_per_hour = 60;
-constexpr int minutes_per_day = 1440;
+constexpr int CHECK_PERIOD_MS = 20000;
+constexpr int MINUTES_PER_HOUR = 60;
+constexpr int MINUTES_PER_DAY = 1440;
 
 enum night_switch_value : int { NIGHT_SWITCH_OFF = 0, NIGHT_SWITCH_ON = 1, NIGHT_SWITCH_SUSPENDED = 2 };
 
@@ -47,6 +48,8 @@ static int read_int(const char *key)
     return kiv_led_text_to_int(read_text(key).data());
 }
 
+// NV says it before the daemon does, for whoever reads NV at the relight; the relight comes last, because each LED that
+// it shows afresh passes the night-mode gate, which asks is_night_mode.
 static void set_night_mode(int on)
 {
     kiv_nvconfig_write("is_night_mode", on == 1 ? "1" : "0", 1);
@@ -73,14 +76,15 @@ static bool is_inside(int start, int end, int now)
     if (start < end) {
         return start <= now && now < end;
     }
-    return (start <= now && now < minutes_per_day) || (0 <= now && now < end);
+    return (start <= now && now < MINUTES_PER_DAY) || (0 <= now && now < end);
 }
 
 static bool is_in_window()
 {
     const std::time_t seconds = std::time(nullptr);
-    const std::tm *utc = std::gmtime(&seconds); // its buffer is ours while the mutex is held
-    const int now = utc == nullptr ? 0 : minutes_per_hour * utc->tm_hour + utc->tm_min;
+    std::tm utc = {};
+    gmtime_r(&seconds, &utc);
+    const int now = MINUTES_PER_HOUR * utc.tm_hour + utc.tm_min;
 
     if (!clock_is_synchronised()) {
         return false;
@@ -127,6 +131,15 @@ static void check(const char *arg)
     }
 }
 
+// One check of the clock against the window, at a set-up and every 20 s. Timer, main and receive thread, one at a time.
+// arg: text of one character for the first check after a set-up, "" or null for the timer's.
+static void kiv_led_night_mode_proc(void *arg)
+{
+    pthread_mutex_lock(&night_mode_mutex);
+    check(static_cast<const char *>(arg));
+    pthread_mutex_unlock(&night_mode_mutex);
+}
+
 static void read_times()
 {
     // One hour and one minute for both: what the end time's text does not say, it takes over from the start time.
@@ -136,12 +149,12 @@ static void read_times()
     const night_text start = read_text("night_mode_start_time");
     LED_INFO("Night mode: start_time:%s\n", start.data());
     std::sscanf(start.data(), "%d:%d", &hour, &minute);
-    night_start_minute = minutes_per_hour * hour + minute;
+    night_start_minute = MINUTES_PER_HOUR * hour + minute;
 
     const night_text end = read_text("night_mode_end_time");
     LED_INFO("Night mode: end_time:%s\n", end.data());
     std::sscanf(end.data(), "%d:%d", &hour, &minute);
-    night_end_minute = minutes_per_hour * hour + minute;
+    night_end_minute = MINUTES_PER_HOUR * hour + minute;
 }
 
 static void read_close_all_led()
@@ -155,21 +168,10 @@ static void read_close_all_led()
     }
 }
 
-static void start_check_timer()
-{
-    if (night_check_timer != 0) {
-        return;
-    }
-    night_check_timer = kiv_timer(kiv_led_night_mode_proc, timer_check, check_period_ms, 1);
-    if (night_check_timer != 0) {
-        LED_INFO("Creat night mode check timer SUCCESS\n");
-    }
-}
-
+// A check that is under way on the timer thread may still enter the window behind this; the next set-up lifts it.
 static void switch_off()
 {
-    kiv_delete_timer(night_check_timer);
-    night_check_timer = 0;
+    kiv_delete_timer(kiv_led_take_timer(night_check_timer));
     kiv_nvconfig_write("is_night_mode", "0", 1);
     night_window_entered = 0;
     is_night_mode = 0;
@@ -188,15 +190,10 @@ void kiv_led_night_mode_init()
     read_close_all_led();
     if (value == NIGHT_SWITCH_ON || value == NIGHT_SWITCH_SUSPENDED) {
         kiv_led_night_mode_proc(first_check);
-        start_check_timer();
+        if (kiv_led_start_timer(night_check_timer, kiv_led_night_mode_proc, timer_check, CHECK_PERIOD_MS)) {
+            LED_INFO("Creat night mode check timer SUCCESS\n");
+        }
     } else {
         switch_off();
     }
-}
-
-void kiv_led_night_mode_proc(void *arg)
-{
-    pthread_mutex_lock(&night_mode_mutex);
-    check(static_cast<const char *>(arg));
-    pthread_mutex_unlock(&night_mode_mutex);
 }

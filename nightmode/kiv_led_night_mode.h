@@ -5,7 +5,3 @@
 // "night_mode_close_all_led"), checks at once, and keeps a 20 s timer while the switch is 1 or 2. May be run again at
 // any time. Main thread, and receive thread for message KIV_MSG_CMD_LED_NIGHT_MODE_MSG.
 void kiv_led_night_mode_init();
-
-// One check of the clock against the window. arg: text of one character for the first check after a set-up, "" or null
-// for the timer's. Timer, main and receive thread, one at a time.
-void kiv_led_night_mode_proc(void *arg);

@@ -1,30 +1,21 @@
 #include "output/led_groups.h"
 
-#include "core/led_log.h"
+#include "ground/led_ctx.h"
+#include "ground/led_log.h"
 #include "kiv/adabsp.h"
-#include "output/night_mode_gate.h"
 
 #include <array>
 #include <span>
 
-constexpr char led_log_source[] = "kiv_mirta_led_operation";
+constexpr char LED_LOG_SOURCE[] = "kiv_mirta_led_operation";
+constexpr int DIMMED_BRIGHTNESS = 1;
 
 struct off_row {
     int led_id;
     const char *fail_text; // followed by the board's result
 };
 
-enum class group_off { never, before_entry, after_entry };
-
-struct led_group {
-    std::span<const off_row> leds; // in the order in which they are switched off
-    const char *off_entry;
-    const char *entry; // followed by the LED id
-    group_off switched_off = group_off::never;
-    bool gated = false;
-    const char *fail_text = nullptr; // followed by the board's result; without it the line names the LED
-};
-
+// The LEDs of a group in the order in which they are switched off.
 constexpr auto sig_leds = std::array{
     off_row{LED_SIG_BLUE, "set sig blue off fail:"}
 };
@@ -75,80 +66,28 @@ constexpr auto voice_leds = std::array{
 };
 constexpr std::array<int32_t, 16> sigbar_leds = {66, 67, 68, 69, 70, 71, 72, 73, 74, 75, 76, 77, 78, 79, 80, 81};
 
-// Some entry lines begin with "enter " and end in a newline, some are the bare name: field logs are searched for them.
-constexpr led_group sig_group = {
-    .leds = sig_leds,
-    .off_entry = "enter kiv_led_set_sig_led_off\n",
-    .entry = "enter kiv_led_set_sig_led_operation led_id=",
-    .gated = true,
-    .fail_text = "set sig blue led fail: ",
-};
-constexpr led_group net_group = {
-    .leds = net_leds,
-    .off_entry = "enter kiv_led_set_net_led_off\n",
-    .entry = "enter kiv_led_set_net_led_operation led_id=",
-    .switched_off = group_off::after_entry,
-    .gated = true,
-    .fail_text = "set net led fail: ",
-};
-constexpr led_group rssi_group = {
-    .leds = rssi_leds,
-    .off_entry = "kiv_led_set_rssi_led_off",
-    .entry = "kiv_led_set_rssi_led_operation led_id=",
-    .switched_off = group_off::after_entry,
-};
-constexpr led_group power_group = {
-    .leds = power_leds,
-    .off_entry = "enter kiv_led_set_power_led_off\n",
-    .entry = "enter kiv_led_set_power_led_operation led_id=",
-    .gated = true,
-    .fail_text = "set power led fail: ",
-};
-constexpr led_group bat_group = {
-    .leds = bat_leds,
-    .off_entry = "kiv_led_set_bat_led_off",
-    .entry = "enter kiv_led_set_bat_led_operation led_id=",
-    .switched_off = group_off::after_entry,
-};
-constexpr led_group wifi_group = {
-    .leds = wifi_leds,
-    .off_entry = "kiv_led_set_wifi_led_off",
-    .entry = "enter kiv_led_set_wifi_led_operation led_id=",
-    .gated = true,
-};
-constexpr led_group sms_group = {
-    .leds = sms_leds,
-    .off_entry = "kiv_led_set_sms_led_off",
-    .entry = "enter kiv_led_set_sms_led_operation led_id=",
-    .switched_off = group_off::before_entry,
-};
-constexpr led_group flow_group = {
-    .leds = flow_leds,
-    .off_entry = "kiv_led_set_flow_led_off",
-    .entry = "enter kiv_led_set_flow_led_operation led_id=",
-    .switched_off = group_off::before_entry,
-};
-constexpr led_group voicemail_group = {
-    .leds = voicemail_leds,
-    .off_entry = "kiv_led_set_voicemail_led_off",
-    .entry = "kiv_led_set_voicemail_led_operation led_id=",
-    .switched_off = group_off::before_entry,
-};
-constexpr led_group voice_group = {
-    .leds = voice_leds,
-    .off_entry = "kiv_led_set_voice_led_off",
-    .entry = "kiv_led_set_voice_led_operation led_id=",
-    .switched_off = group_off::before_entry,
-};
+// The one place where a step becomes the board's record, which has another order.
+static led_request request_of(const led_step &step)
+{
+    return {.led_id = step.led_id,
+            .led_operation = step.led_operation,
+            .brightness = step.brightness,
+            .blink_time1 = step.blink_time1,
+            .blink_time2 = step.blink_time2};
+}
 
-// Makes one request; the board's result, 0 when it was carried out.
+// Makes one request; the board's result, 0 when it was carried out. A board may write the result on failure only.
 static int set_led(const led_step &step)
 {
     int result = 0;
 
-    kiv_bsp_set_leds_sync({step.led_id, step.led_operation, step.brightness, step.blink_time1, step.blink_time2},
-                          &result);
+    kiv_bsp_set_leds_sync(request_of(step), &result);
     return result;
+}
+
+static int set_led_off(int led_id)
+{
+    return set_led({led_id, LED_OP_OFF, 0, 0, 0});
 }
 
 static void set_led_or_log(const led_step &step)
@@ -160,116 +99,110 @@ static void set_led_or_log(const led_step &step)
     }
 }
 
-static void switch_off(const led_group &group)
+static void switch_off(std::span<const off_row> leds)
 {
-    int result = 0;
-    led_request request = {
-        .led_id = 0, .led_operation = LED_OP_OFF, .brightness = 0, .blink_time1 = 0, .blink_time2 = 0};
+    for (const off_row &row : leds) {
+        const int result = set_led_off(row.led_id);
 
-    LED_INFO("%s", group.off_entry);
-    for (const off_row &row : group.leds) {
-        request.led_id = row.led_id;
-        kiv_bsp_set_leds_sync(request, &result);
         if (result != 0) {
             LED_ERROR("%s%d\n", row.fail_text, result);
         }
     }
 }
 
-static void log_entry(const led_group &group, const led_step &step)
+static bool stays_lit_at_night(int led_id)
 {
-    LED_INFO("%s%d,led_operation=%d\n", group.entry, step.led_id, step.led_operation);
+    return led_id == LED_NET_RED || led_id == LED_NET_BLUE || led_id == LED_NET_WHITE;
 }
 
-static void pass_night_mode_gate(led_step &step)
+// The night-mode gate: the one place where night mode changes a request on its way to the board.
+static void kiv_led_night_mode_check(int led_id, int *led_operation, int *brightness)
 {
-    kiv_led_night_mode_check(step.led_id, &step.led_operation, &step.brightness);
-}
-
-static void set_and_log(const led_group &group, const led_step &step)
-{
-    if (group.fail_text == nullptr) {
-        set_led_or_log(step);
+    if (is_night_mode != 1) {
         return;
     }
-    const int result = set_led(step);
-    if (result != 0) {
-        LED_ERROR("%s%d\n", group.fail_text, result);
+    if (stays_lit_at_night(led_id) && night_mode_close_all_led == 0) {
+        *brightness = DIMMED_BRIGHTNESS;
+    } else {
+        *led_operation = LED_OP_OFF;
+        *brightness = 0;
     }
+    LED_INFO("Night mode check: led_id=%d brightness=%d", led_id, *brightness);
 }
 
-static void operate(const led_group &group, led_step step)
+static led_step pass_night_mode_gate(led_step step)
 {
-    if (group.gated) {
-        pass_night_mode_gate(step);
-    }
-    if (group.switched_off == group_off::before_entry) {
-        switch_off(group);
-    }
-    log_entry(group, step);
-    if (group.switched_off == group_off::after_entry) {
-        switch_off(group);
-    }
-    set_and_log(group, step);
+    kiv_led_night_mode_check(step.led_id, &step.led_operation, &step.brightness);
+    return step;
 }
 
+// Some lines begin with "enter " and end in a newline, some are the bare name: field logs are searched for them.
 void kiv_led_set_sig_led_off()
 {
-    switch_off(sig_group);
+    LED_INFO("enter kiv_led_set_sig_led_off\n");
+    switch_off(sig_leds);
 }
 
 void kiv_led_set_net_led_off()
 {
-    switch_off(net_group);
+    LED_INFO("enter kiv_led_set_net_led_off\n");
+    switch_off(net_leds);
 }
 
 void kiv_led_set_rssi_led_off()
 {
-    switch_off(rssi_group);
+    LED_INFO("kiv_led_set_rssi_led_off");
+    switch_off(rssi_leds);
 }
 
 void kiv_led_set_power_led_off()
 {
-    switch_off(power_group);
+    LED_INFO("enter kiv_led_set_power_led_off\n");
+    switch_off(power_leds);
 }
 
 void kiv_led_set_bat_led_off()
 {
-    switch_off(bat_group);
+    LED_INFO("kiv_led_set_bat_led_off");
+    switch_off(bat_leds);
 }
 
 void kiv_led_set_wifi_led_off()
 {
-    switch_off(wifi_group);
+    LED_INFO("kiv_led_set_wifi_led_off");
+    switch_off(wifi_leds);
 }
 
 void kiv_led_set_sms_led_off()
 {
-    switch_off(sms_group);
+    LED_INFO("kiv_led_set_sms_led_off");
+    switch_off(sms_leds);
 }
 
 void kiv_led_set_flow_led_off()
 {
-    switch_off(flow_group);
+    LED_INFO("kiv_led_set_flow_led_off");
+    switch_off(flow_leds);
 }
 
 void kiv_led_set_voicemail_led_off()
 {
-    switch_off(voicemail_group);
+    LED_INFO("kiv_led_set_voicemail_led_off");
+    switch_off(voicemail_leds);
 }
 
 void kiv_led_set_voice_led_off()
 {
-    switch_off(voice_group);
+    LED_INFO("kiv_led_set_voice_led_off");
+    switch_off(voice_leds);
 }
 
 void kiv_led_set_sigbar_led_off()
 {
-    int result = 0;
-
     LED_INFO("kiv_led_set_sigbar_led_off");
     for (const int32_t led_id : sigbar_leds) {
-        kiv_bsp_set_leds_sync({led_id, LED_OP_OFF, 0, 0, 0}, &result);
+        const int result = set_led_off(led_id);
+
         if (result != 0) {
             LED_ERROR("set sigbar %d off fail:%d\n", led_id, result);
         }
@@ -278,74 +211,105 @@ void kiv_led_set_sigbar_led_off()
 
 void kiv_led_set_sig_led_operation(int led_id, int led_operation, int blink_time1, int blink_time2, int brightness)
 {
-    operate(sig_group, {led_id, led_operation, blink_time1, blink_time2, brightness});
+    const led_step step = pass_night_mode_gate({led_id, led_operation, blink_time1, blink_time2, brightness});
+
+    LED_INFO("enter kiv_led_set_sig_led_operation led_id=%d,led_operation=%d\n", step.led_id, step.led_operation);
+
+    const int result = set_led(step);
+    if (result != 0) {
+        LED_ERROR("set sig blue led fail: %d\n", result);
+    }
 }
 
 void kiv_led_set_net_led_operation(int led_id, int led_operation, int blink_time1, int blink_time2, int brightness)
 {
-    operate(net_group, {led_id, led_operation, blink_time1, blink_time2, brightness});
+    const led_step step = pass_night_mode_gate({led_id, led_operation, blink_time1, blink_time2, brightness});
+
+    LED_INFO("enter kiv_led_set_net_led_operation led_id=%d,led_operation=%d\n", step.led_id, step.led_operation);
+    kiv_led_set_net_led_off();
+
+    const int result = set_led(step);
+    if (result != 0) {
+        LED_ERROR("set net led fail: %d\n", result);
+    }
 }
 
 void kiv_led_set_rssi_led_operation(int led_id, int led_operation, int blink_time1, int blink_time2, int brightness)
 {
-    operate(rssi_group, {led_id, led_operation, blink_time1, blink_time2, brightness});
+    LED_INFO("kiv_led_set_rssi_led_operation led_id=%d,led_operation=%d\n", led_id, led_operation);
+    kiv_led_set_rssi_led_off();
+    set_led_or_log({led_id, led_operation, blink_time1, blink_time2, brightness});
 }
 
 void kiv_led_set_power_led_operation(int led_id, int led_operation, int blink_time1, int blink_time2, int brightness)
 {
-    led_step step = {led_id, led_operation, blink_time1, blink_time2, brightness};
+    const led_step step = pass_night_mode_gate({led_id, led_operation, blink_time1, blink_time2, brightness});
 
-    pass_night_mode_gate(step);
-    log_entry(power_group, step);
+    LED_INFO("enter kiv_led_set_power_led_operation led_id=%d,led_operation=%d\n", step.led_id, step.led_operation);
     if (led_id != LED_POWER_BLUE) {
         LED_ERROR("led id error!\n");
         return;
     }
-    set_and_log(power_group, step);
+    const int result = set_led(step);
+    if (result != 0) {
+        LED_ERROR("set power led fail: %d\n", result);
+    }
 }
 
 void kiv_led_set_bat_led_operation(int led_id, int led_operation, int blink_time1, int blink_time2, int brightness)
 {
-    operate(bat_group, {led_id, led_operation, blink_time1, blink_time2, brightness});
+    LED_INFO("enter kiv_led_set_bat_led_operation led_id=%d,led_operation=%d\n", led_id, led_operation);
+    kiv_led_set_bat_led_off();
+    set_led_or_log({led_id, led_operation, blink_time1, blink_time2, brightness});
 }
 
 void kiv_led_set_wifi_led_operation(int led_id, int led_operation, int blink_time1, int blink_time2, int brightness)
 {
-    operate(wifi_group, {led_id, led_operation, blink_time1, blink_time2, brightness});
+    const led_step step = pass_night_mode_gate({led_id, led_operation, blink_time1, blink_time2, brightness});
+
+    LED_INFO("enter kiv_led_set_wifi_led_operation led_id=%d,led_operation=%d\n", step.led_id, step.led_operation);
+    set_led_or_log(step);
 }
 
 void kiv_led_set_sms_led_operation(int led_id, int led_operation, int blink_time1, int blink_time2, int brightness)
 {
-    operate(sms_group, {led_id, led_operation, blink_time1, blink_time2, brightness});
+    kiv_led_set_sms_led_off();
+    LED_INFO("enter kiv_led_set_sms_led_operation led_id=%d,led_operation=%d\n", led_id, led_operation);
+    set_led_or_log({led_id, led_operation, blink_time1, blink_time2, brightness});
 }
 
 void kiv_led_set_flow_led_operation(int led_id, int led_operation, int blink_time1, int blink_time2, int brightness)
 {
-    operate(flow_group, {led_id, led_operation, blink_time1, blink_time2, brightness});
+    kiv_led_set_flow_led_off();
+    LED_INFO("enter kiv_led_set_flow_led_operation led_id=%d,led_operation=%d\n", led_id, led_operation);
+    set_led_or_log({led_id, led_operation, blink_time1, blink_time2, brightness});
 }
 
 void kiv_led_set_voicemail_led_operation(int led_id, int led_operation, int blink_time1, int blink_time2,
                                          int brightness)
 {
-    const led_step step = {led_id, led_operation, blink_time1, blink_time2, brightness};
-
     if (led_id < LED_VOICEMAIL_RED || led_id > LED_VOICEMAIL_YELLOW) {
         LED_ERROR("kiv_led_set_voicemail_led_operation led_id error\n");
         return;
     }
-    if (led_operation != LED_OP_OFF) {
-        operate(voicemail_group, step);
+    if (led_operation == LED_OP_OFF) {
+        const int result = set_led({led_id, led_operation, blink_time1, blink_time2, brightness});
+
+        if (result != 0) {
+            LED_ERROR("set %d  off fail:%d\n", led_id, result);
+        }
         return;
     }
-    const int result = set_led(step);
-    if (result != 0) {
-        LED_ERROR("set %d  off fail:%d\n", led_id, result);
-    }
+    kiv_led_set_voicemail_led_off();
+    LED_INFO("kiv_led_set_voicemail_led_operation led_id=%d,led_operation=%d\n", led_id, led_operation);
+    set_led_or_log({led_id, led_operation, blink_time1, blink_time2, brightness});
 }
 
 void kiv_led_set_voice_led_operation(int led_id, int led_operation, int blink_time1, int blink_time2, int brightness)
 {
-    operate(voice_group, {led_id, led_operation, blink_time1, blink_time2, brightness});
+    kiv_led_set_voice_led_off();
+    LED_INFO("kiv_led_set_voice_led_operation led_id=%d,led_operation=%d\n", led_id, led_operation);
+    set_led_or_log({led_id, led_operation, blink_time1, blink_time2, brightness});
 }
 
 void kiv_led_set_sigbar_led_operation(int led_id, int led_operation, int blink_time1, int blink_time2, int brightness)

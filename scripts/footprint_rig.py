@@ -1,5 +1,6 @@
 """Runs the daemon on the stand-ins and plays the system daemon and the other modules to it."""
 
+import contextlib
 import fcntl
 import os
 import pathlib
@@ -71,8 +72,11 @@ class Rig:
         self.close()
 
     def close(self):
-        os.killpg(self.process.pid, signal.SIGKILL)  # strace, killed alone, would let the daemon run on
+        with contextlib.suppress(ProcessLookupError):
+            os.killpg(self.process.pid, signal.SIGKILL)  # strace, killed alone, would let the daemon run on
         self.process.wait()
+        for end in (self.system, self.main, self.sender):
+            end.close()
         shutil.rmtree(self.dir)
 
     def _queue(self, name):

@@ -24,8 +24,12 @@ quietly() {
     "$@" >"$log" 2>&1 || { tail -n 60 "$log" >&2; echo "error: $* failed; all of it is in $log" >&2; return 1; }
 }
 
-build_packages=(g++ cmake ninja-build libcli11-dev libgtest-dev python3)
+build_packages=(g++ cmake ninja-build libcli11-dev libcpp-httplib-dev libedit-dev nlohmann-json3-dev libgtest-dev libfuse3-dev
+    pkg-config python3)
+browser_packages=(chromium chromium-driver)
 armv7_packages=(g++-arm-linux-gnueabihf qemu-user googletest)
+
+debian_packages=(dpkg-dev file lintian)
 
 # build_preset PRESET TARGET... configures and builds into build/PRESET/.
 build_preset() {

@@ -1,17 +1,17 @@
 #include "table.h"
 
-#include "names.h"
+#include "language/names.h"
 #include "player.h"
 
 #include <array>
 #include <cstdio>
+#include <fcntl.h>
 #include <string>
 #include <sys/wait.h>
 #include <unistd.h>
 
 namespace
 {
-// Products as they are listed in names.
 enum product_mask : unsigned {
     UFI = 1,
     DATA_CARD = 2,
@@ -20,8 +20,22 @@ enum product_mask : unsigned {
     UNI_CORE = 16,
     POWERED = UFI | MODULE | UNI_CORE, // told when the device is on
     WIFI = UFI | PAPER_KITE | UNI_CORE,
+    WPS = PAPER_KITE | UNI_CORE,
     REMINDED = UFI | PAPER_KITE | UNI_CORE,
     EVERY = 31,
+};
+
+struct product_row {
+    std::string_view name;
+    unsigned mask;
+};
+
+constexpr std::array product_rows = {
+    product_row{"UFI",          UFI       },
+    product_row{"DATA_CARD",    DATA_CARD },
+    product_row{"PAPER_KITE",   PAPER_KITE},
+    product_row{"MODULE",       MODULE    },
+    product_row{"UNI_CORE_CPE", UNI_CORE  },
 };
 
 struct state_row {
@@ -84,7 +98,7 @@ constexpr std::array states = {
 
     state_row{WIFI,                          "",                                                          "Wi-Fi"                                                              },
     state_row{WIFI,                          "off",                                                       "nv wifi_onoff_state=0\nnotify WLAN CURRENT_STATUS 0"                },
-    state_row{WIFI,                          "WPS pairing",                                               "nv wifi_chip1_wps_state=1\nnotify WLAN AP_WPS_STATE 1"              },
+    state_row{WPS,                           "WPS pairing",                                               "nv wifi_chip1_wps_state=1\nnotify WLAN AP_WPS_STATE 1"              },
 
     state_row{UFI | MODULE | UNI_CORE,       "",                                                          "Messages and calls"                                                 },
     state_row{UFI,                           "new message",                                               "nv sms_nvunread_count=1\nnotify SMS NEW_SMS"                        },
@@ -111,24 +125,22 @@ constexpr std::array states = {
 
 unsigned mask_of(const product_name &product)
 {
-    return 1U << (&product - all_products().data());
+    for (const product_row &row : product_rows) {
+        if (row.name == product.name) {
+            return row.mask;
+        }
+    }
+    return 0;
 }
 
-std::string script(const product_name &product, const state_row &row)
-{
-    std::string text = "product " + std::string(product.name) + "\n" + std::string(AT_REST) + "start\n";
-    if (mask_of(product) & POWERED)
-        text += POWER_ON;
-    return text + std::string(row.stimuli);
-}
-
-std::string lit(const play_report &report)
+std::string lit(const table_row &row)
 {
     std::string list;
     for (int led = 0; led < LED_ID_COUNT; led++) {
-        const led_look &look = report.leds[static_cast<size_t>(led)];
-        if (look.mode != led_mode::OFF && look.brightness > 0)
+        const led_look &look = row.leds[static_cast<size_t>(led)];
+        if (look.mode != led_mode::OFF && look.brightness > 0) {
             list += (list.empty() ? "" : ", ") + std::string(led_name(led)) + " " + describe(look);
+        }
     }
     return list.empty() ? "dark" : list;
 }
@@ -138,61 +150,87 @@ bool no_include(const std::string &, std::string &)
     return false;
 }
 
-int print_row(const product_name &product, const state_row &row, const daemon_options &options)
+int play_state(const product_name &product, const state_row &row, const daemon_options &options, table_row &out)
 {
     scenario story;
     std::string error;
-    if (!parse_scenario(script(product, row), std::string(row.state), no_include, story, error)) {
+    if (!parse_scenario(switched_on(product) + std::string(row.stimuli), std::string(row.state), no_include, story,
+                        error)) {
         fprintf(stderr, "%s\n", error.c_str());
         return PLAY_IMPOSSIBLE;
     }
-    play_options how;
+    player_options how;
     how.process = options;
-    const play_report report = play(story, how);
-    if (report.result != PLAY_HELD)
-        fputs(report.failure.c_str(), stderr);
-    else
-        printf("| %s | %s |\n", std::string(row.state).c_str(), lit(report).c_str());
-    return report.result;
+    const play_report report = play(story, how, false);
+    fputs(report.last.failure.c_str(), stderr);
+    out.leds = report.leds;
+    return report.last.result;
 }
 
-int print_row_apart(const product_name &product, const state_row &row, const daemon_options &options)
+// In a process of its own, which hands the LEDs back through a pipe.
+int play_state_apart(const product_name &product, const state_row &row, const daemon_options &options, table_row &out)
 {
+    std::array<int, 2> ends = {-1, -1};
+    if (pipe2(ends.data(), O_CLOEXEC) != 0) {
+        return PLAY_FAILED;
+    }
     fflush(stdout);
     const pid_t child = fork();
     if (child == 0) {
-        const int result = print_row(product, row, options);
-        fflush(stdout);
-        _exit(result);
+        const int result = play_state(product, row, options, out);
+        const bool told = write(ends[1], out.leds.data(), sizeof out.leds) == sizeof out.leds;
+        _exit(result == 0 && !told ? PLAY_FAILED : result);
     }
+    close(ends[1]);
+    const bool heard = read(ends[0], out.leds.data(), sizeof out.leds) == sizeof out.leds;
+    close(ends[0]);
     int status = 0;
-    if (child < 0 || waitpid(child, &status, 0) < 0 || !WIFEXITED(status))
+    if (child < 0 || waitpid(child, &status, 0) < 0 || !WIFEXITED(status)) {
         return PLAY_FAILED;
-    return WEXITSTATUS(status);
+    }
+    return WEXITSTATUS(status) == 0 && !heard ? PLAY_FAILED : WEXITSTATUS(status);
 }
 } // namespace
 
-int print_table(std::string_view name, const daemon_options &wanted)
+std::string switched_on(const product_name &product)
 {
-    daemon_options options = wanted;
-    std::string error;
-    const product_name *product = find_product(name);
-    if (!product)
-        error = "unknown product '" + std::string(name) + "'; products are " + product_names();
-    else
-        find_daemon(options, error);
-    if (!error.empty()) {
-        fprintf(stderr, "%s\n", error.c_str());
-        return PLAY_IMPOSSIBLE;
+    const bool is_told = (mask_of(product) & POWERED) != 0;
+    return "product " + std::string(product.name) + "\n" + std::string(AT_REST) + "start\n" +
+           std::string(is_told ? POWER_ON : "");
+}
+
+int play_table(const product_name &product, const daemon_options &options, std::vector<table_row> &rows)
+{
+    const unsigned mask = mask_of(product);
+    if (mask == 0) {
+        fprintf(stderr, "the table has no state of %s\n", std::string(product.name).c_str());
+        return PLAY_FAILED;
     }
-    printf("| %s | LEDs that are lit |\n| --- | --- |\n", std::string(product->name).c_str());
-    for (const state_row &row : states) {
-        if (!(row.products & mask_of(*product)))
+    for (const state_row &state : states) {
+        if (!(state.products & mask)) {
             continue;
-        if (row.state.empty())
-            printf("| **%s** | |\n", std::string(row.stimuli).c_str());
-        else if (const int result = print_row_apart(*product, row, options))
+        }
+        table_row &row = rows.emplace_back();
+        row.heading = state.state.empty();
+        row.state = row.heading ? state.stimuli : state.state;
+        if (row.heading) {
+            continue;
+        }
+        if (const int result = play_state_apart(product, state, options, row)) {
             return result;
+        }
     }
     return 0;
+}
+
+void print_table(const product_name &product, const std::vector<table_row> &rows)
+{
+    printf("| %s | LEDs that are lit |\n| --- | --- |\n", std::string(product.name).c_str());
+    for (const table_row &row : rows) {
+        if (row.heading) {
+            printf("| **%s** | |\n", row.state.c_str());
+        } else {
+            printf("| %s | %s |\n", row.state.c_str(), lit(row).c_str());
+        }
+    }
 }

@@ -1,6 +1,7 @@
 #include "kiv/cfg.h"
 
 #include "standin.h"
+#include "trace/calls.h"
 
 #include <cstdint>
 #include <cstdio>
@@ -10,8 +11,9 @@ static int get_byte(const char *name, void *buffer)
 {
     char text[16];
     int value = 0;
-    if (standin_read_text("cfg", name, text, sizeof text) < 0)
+    if (standin_read_text("cfg", name, text, sizeof text) < 0) {
         return -1;
+    }
     if (standin_parse_ints(text, &value, 1) != 1 || value < 0 || value > UINT8_MAX) {
         standin_error("cfg/%s: not a number from 0 to 255: %s", name, text);
         return -1;
@@ -23,32 +25,20 @@ static int get_byte(const char *name, void *buffer)
 static int get_item(int item, void *buffer, int size)
 {
     char name[16];
-    if (buffer == nullptr || size <= 0)
+    if (buffer == nullptr || size <= 0) {
         return -1;
+    }
     snprintf(name, sizeof name, "%d", item);
-    if (item == KIV_CFG_9X15_LED_ID)
+    if (item == KIV_CFG_9X15_LED_ID) {
         return get_byte(name, buffer);
+    }
     return standin_read_text("cfg", name, static_cast<char *>(buffer), size) < 0 ? -1 : 0;
 }
 
 int kiv_cfg_get_item(int item, void *buffer, int size)
 {
-    if (standin_watched == 0)
-        return get_item(item, buffer, size);
-    trace_line line;
-    int result = 0;
-    trace_begin(line, "kiv_cfg_get_item");
-    trace_add(line, "%d, %d", item, size);
-    if (trace_fault(line, &result))
-        return result;
-    result = get_item(item, buffer, size);
-    trace_result(line, result);
-    if (result == 0 && item == KIV_CFG_9X15_LED_ID) {
-        trace_add(line, ", %d", *static_cast<uint8_t *>(buffer));
-    } else if (result == 0) {
-        trace_add(line, ", ");
-        trace_text(line, static_cast<const char *>(buffer));
-    }
-    trace_end(line);
-    return result;
+    return standin_call(
+        __func__, [&](trace_line &line) { trace_cfg_get(line, item, size); },
+        [&] { return get_item(item, buffer, size); },
+        [&](trace_line &line, int result) { trace_cfg_get_result(line, result, item, buffer, size); });
 }

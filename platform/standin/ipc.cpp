@@ -2,6 +2,8 @@
 
 #include "indications.h"
 #include "standin.h"
+#include "trace/calls.h"
+#include "ubox/uloop.h"
 
 #include <algorithm>
 #include <array>
@@ -9,13 +11,12 @@
 #include <climits>
 #include <cstring>
 #include <ctime>
-#include <libubox/uloop.h>
 #include <pthread.h>
 #include <sys/socket.h>
 #include <unistd.h>
 
-constexpr int64_t ns_per_ms = 1000000;
-constexpr int64_t ns_per_s = 1000000000;
+constexpr int64_t NS_PER_MS = 1000000;
+constexpr int64_t NS_PER_S = 1000000000;
 
 struct timer_slot {
     int handle; // 0: free
@@ -37,18 +38,20 @@ static int64_t now_ns()
 {
     timespec now{};
     clock_gettime(CLOCK_MONOTONIC, &now);
-    return now.tv_sec * ns_per_s + now.tv_nsec;
+    return now.tv_sec * NS_PER_S + now.tv_nsec;
 }
 
 static timer_slot *next_timer()
 {
     timer_slot *next = nullptr;
     for (timer_slot &slot : timers) {
-        if (slot.handle == 0)
+        if (slot.handle == 0) {
             continue;
+        }
         if (next == nullptr || slot.deadline_ns < next->deadline_ns ||
-            (slot.deadline_ns == next->deadline_ns && slot.handle < next->handle))
+            (slot.deadline_ns == next->deadline_ns && slot.handle < next->handle)) {
             next = &slot;
+        }
     }
     return next;
 }
@@ -56,8 +59,9 @@ static timer_slot *next_timer()
 static timer_slot *find_timer(int handle)
 {
     for (timer_slot &slot : timers) {
-        if (slot.handle == handle)
+        if (slot.handle == handle) {
             return &slot;
+        }
     }
     return nullptr;
 }
@@ -70,10 +74,11 @@ static timer_slot wait_for_due_timer()
             pthread_cond_wait(&changed, &lock);
             continue;
         }
-        if (next->deadline_ns <= now_ns())
+        if (next->deadline_ns <= now_ns()) {
             return *next;
-        const timespec until = {static_cast<time_t>(next->deadline_ns / ns_per_s),
-                                static_cast<long>(next->deadline_ns % ns_per_s)};
+        }
+        const timespec until = {static_cast<time_t>(next->deadline_ns / NS_PER_S),
+                                static_cast<long>(next->deadline_ns % NS_PER_S)};
         pthread_cond_timedwait(&changed, &lock, &until);
     }
 }
@@ -89,16 +94,6 @@ static void arm_again(timer_slot &slot)
     slot.deadline_ns += (missed + 1) * slot.period_ns;
 }
 
-static void trace_fire(int handle)
-{
-    if (standin_watched == 0)
-        return;
-    trace_line line;
-    trace_begin(line, "kiv_timer_fire");
-    trace_add(line, "%d)", handle);
-    trace_end(line);
-}
-
 // The slot is settled before its callback runs, so that the callback may delete its own timer or start others.
 static void *serve_timers(void *)
 {
@@ -108,7 +103,7 @@ static void *serve_timers(void *)
         const timer_slot due = wait_for_due_timer();
         arm_again(*find_timer(due.handle));
         pthread_mutex_unlock(&lock);
-        trace_fire(due.handle);
+        standin_event("kiv_timer_fire", [&](trace_line &line) { trace_timer_fire(line, due.handle); });
         due.callback(due.argument);
         pthread_mutex_lock(&lock);
     }
@@ -119,15 +114,17 @@ static bool start_service()
 {
     pthread_t thread;
     pthread_condattr_t attributes;
-    if (service_started)
+    if (service_started) {
         return true;
+    }
     pthread_condattr_init(&attributes);
     pthread_condattr_setclock(&attributes, CLOCK_MONOTONIC);
     pthread_cond_init(&changed, &attributes);
     pthread_condattr_destroy(&attributes);
     service_started = pthread_create(&thread, nullptr, serve_timers, nullptr) == 0;
-    if (service_started)
+    if (service_started) {
         pthread_detach(thread);
+    }
     return service_started;
 }
 
@@ -142,9 +139,10 @@ static int fresh_handle()
 
 static int add_timer(void (*callback)(void *), void *argument, int period_ms, int repeat)
 {
-    if (callback == nullptr || period_ms <= 0)
+    if (callback == nullptr || period_ms <= 0) {
         return 0;
-    const int64_t period_ns = period_ms * ns_per_ms;
+    }
+    const int64_t period_ns = period_ms * NS_PER_MS;
     int handle = 0;
     pthread_mutex_lock(&lock);
     timer_slot *slot = find_timer(0);
@@ -176,21 +174,12 @@ static bool parse_indication(char *text, int *event_id, bool *has_record)
     *has_record = word == nullptr;
     if (word != nullptr) {
         const char *rest = word + strlen(" null");
-        if (rest[strspn(rest, " \n")] != '\0')
+        if (rest[strspn(rest, " \n")] != '\0') {
             return false;
+        }
         *word = '\0';
     }
     return standin_parse_ints(text, event_id, 1) == 1;
-}
-
-static void trace_indication(int event_id, bool has_record)
-{
-    if (standin_watched == 0)
-        return;
-    trace_line line;
-    trace_begin(line, "kiv_bsp_ind");
-    trace_add(line, "%d%s)", event_id, has_record ? "" : ", null");
-    trace_end(line);
 }
 
 static void take_indication(uloop_fd *source, unsigned int)
@@ -200,29 +189,32 @@ static void take_indication(uloop_fd *source, unsigned int)
     bool has_record = true;
     trace_label("ipc");
     const ssize_t length = recv(source->fd, text, sizeof text - 1, MSG_DONTWAIT | MSG_TRUNC);
-    if (length < 0)
+    if (length < 0) {
         return;
+    }
     const bool fits = length < static_cast<ssize_t>(sizeof text) && strlen(text) == static_cast<size_t>(length);
     if (!fits || !parse_indication(text, &event_id, &has_record)) {
         standin_error("bsp/ind: a datagram of %d bytes is not \"ID\" or \"ID null\"", static_cast<int>(length));
         return;
     }
-    trace_indication(event_id, has_record);
+    standin_event("kiv_bsp_ind", [&](trace_line &line) { trace_indication(line, event_id, has_record); });
     bsp_deliver_ind(event_id, has_record);
 }
 
 static int set_up_ipc()
 {
-    if (indications.registered)
+    if (indications.registered) {
         return 0;
+    }
     if (uloop_init() != 0) {
         standin_error("uloop_init failed: %s", strerror(errno));
         return -1;
     }
     indications.fd = standin_bind("bsp/ind");
     indications.cb = take_indication;
-    if (indications.fd < 0)
+    if (indications.fd < 0) {
         return -1;
+    }
     if (uloop_fd_add(&indications, ULOOP_READ) != 0) {
         standin_error("bsp/ind cannot join the uloop: %s", strerror(errno));
         close(indications.fd);
@@ -237,48 +229,19 @@ static int set_up_ipc()
 
 int kiv_ipc_init(int log_id, int flag)
 {
-    if (standin_watched == 0)
-        return set_up_ipc();
-    trace_line line;
-    int result = 0;
-    trace_begin(line, "kiv_ipc_init");
-    trace_add(line, "%d, %d", log_id, flag);
-    if (trace_fault(line, &result))
-        return result;
-    result = set_up_ipc();
-    trace_result(line, result);
-    trace_end(line);
-    return result;
+    return standin_call(
+        __func__, [&](trace_line &line) { trace_ints(line, log_id, flag); }, set_up_ipc);
 }
 
 int kiv_timer(void (*callback)(void *), void *argument, int period_ms, int repeat)
 {
-    if (standin_watched == 0)
-        return add_timer(callback, argument, period_ms, repeat);
-    trace_line line;
-    int result = 0;
-    trace_begin(line, "kiv_timer");
-    trace_add(line, "%d, %s", period_ms, repeat != 0 ? "repeat" : "once");
-    if (trace_fault(line, &result))
-        return result;
-    result = add_timer(callback, argument, period_ms, repeat);
-    trace_result(line, result);
-    trace_end(line);
-    return result;
+    return standin_call(
+        __func__, [&](trace_line &line) { trace_timer(line, period_ms, repeat); },
+        [&] { return add_timer(callback, argument, period_ms, repeat); });
 }
 
 int kiv_delete_timer(int handle)
 {
-    if (standin_watched == 0)
-        return remove_timer(handle);
-    trace_line line;
-    int result = 0;
-    trace_begin(line, "kiv_delete_timer");
-    trace_add(line, "%d", handle);
-    if (trace_fault(line, &result))
-        return result;
-    result = remove_timer(handle);
-    trace_result(line, result);
-    trace_end(line);
-    return result;
+    return standin_call(
+        __func__, [&](trace_line &line) { trace_int(line, handle); }, [&] { return remove_timer(handle); });
 }

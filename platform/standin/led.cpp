@@ -29,21 +29,13 @@ static void deliver()
 {
     for (;;) {
         const int result = send_relight(STANDIN_SEND_WAIT_MS);
-        if (result == 0)
+        if (result == 0) {
             return;
-        if (result != -EAGAIN)
+        }
+        if (result != -EAGAIN) {
             sleep(1);
+        }
     }
-}
-
-static void trace_delivery()
-{
-    if (standin_watched == 0)
-        return;
-    trace_line line;
-    trace_begin(line, "kiv_lib_led_relight_deliver");
-    trace_result(line, 0);
-    trace_end(line);
 }
 
 static void *run_helper(void *)
@@ -51,11 +43,12 @@ static void *run_helper(void *)
     trace_label("relight");
     for (;;) {
         pthread_mutex_lock(&lock);
-        while (pending == 0)
+        while (pending == 0) {
             pthread_cond_wait(&wake, &lock);
+        }
         pthread_mutex_unlock(&lock);
         deliver();
-        trace_delivery();
+        standin_event("kiv_lib_led_relight_deliver", [](trace_line &line) { trace_result(line, 0); });
         pthread_mutex_lock(&lock);
         pending--;
         pthread_mutex_unlock(&lock);
@@ -88,15 +81,5 @@ static int request_relight()
 
 int kiv_lib_led_relight_msg(void)
 {
-    if (standin_watched == 0)
-        return request_relight();
-    trace_line line;
-    int result = 0;
-    trace_begin(line, "kiv_lib_led_relight_msg");
-    if (trace_fault(line, &result))
-        return result;
-    result = request_relight();
-    trace_result(line, result);
-    trace_end(line);
-    return result;
+    return standin_call(__func__, no_arguments, request_relight);
 }

@@ -1,6 +1,7 @@
 #include "kiv/log.h"
 
 #include "standin.h"
+#include "trace/calls.h"
 
 #include <chrono>
 #include <cstdarg>
@@ -21,19 +22,22 @@ static std::atomic<unsigned> sink_generation{~0U}; // the generation that sink_f
 static int open_sink()
 {
     const char *path = getenv("KIV_LOG");
-    if (path == nullptr || path[0] == '\0')
+    if (path == nullptr || path[0] == '\0') {
         path = "-";
+    }
     return strcmp(path, "none") == 0 ? SINK_NONE : standin_open_sink("KIV_LOG", path);
 }
 
 static int sink()
 {
-    if (sink_generation.load(std::memory_order_acquire) == standin_generation)
+    if (sink_generation.load(std::memory_order_acquire) == standin_generation) {
         return sink_fd;
+    }
     const std::lock_guard guard(sink_lock);
     if (sink_generation != standin_generation) {
-        if (sink_fd > STDERR_FILENO)
+        if (sink_fd > STDERR_FILENO) {
             close(sink_fd);
+        }
         sink_fd = open_sink();
         sink_generation = standin_generation.load();
     }
@@ -60,14 +64,16 @@ static size_t escape_text(const char *text, char *escaped, size_t size)
 {
     size_t length = strlen(text);
     size_t used = 0;
-    while (length > 0 && text[length - 1] == '\n')
+    while (length > 0 && text[length - 1] == '\n') {
         length--;
+    }
     for (size_t at = 0; at < length && used + 5 < size; at++) {
         const auto byte = static_cast<unsigned char>(text[at]);
-        if (byte < 0x20 || byte == 0x7f)
+        if (byte < 0x20 || byte == 0x7f) {
             used += static_cast<size_t>(snprintf(escaped + used, size - used, "\\x%02x", byte));
-        else
+        } else {
             escaped[used++] = text[at];
+        }
     }
     return used;
 }
@@ -79,46 +85,35 @@ static void write_line(int fd, int level, const char *file, int line, const char
     char newline[] = "\n";
     const int head_length = format_head(head, sizeof head, level, file, line);
     const size_t body_length = escape_text(text, body, sizeof body);
-    const iovec parts[] = {
+    iovec parts[] = {
         {head,    static_cast<size_t>(head_length)},
         {body,    body_length                     },
         {newline, 1                               }
     };
-    if (writev(fd, parts, 3) < 0)
-        return; // a log that cannot be written stops nobody
-}
-
-// True: the call was made to fail, so the line does not reach the sink.
-static bool watch(int level, const char *file, int line, int log_id, const char *text)
-{
-    trace_line trace;
-    int ignored = 0;
-    trace_begin(trace, "kiv_syslog_append");
-    trace_add(trace, "%d, ", level);
-    trace_text(trace, file);
-    trace_add(trace, ", %d, %d, ", line, log_id);
-    trace_text(trace, text);
-    if (trace_fault(trace, &ignored))
-        return true;
-    trace_add(trace, ")");
-    trace_end(trace);
-    return false;
+    standin_write(fd, parts, 3); // a log that cannot be written stops nobody
 }
 
 void kiv_syslog_append(int level, const char *file, int line, int log_id, const char *format, ...)
 {
     const int fd = sink();
-    if (fd == SINK_NONE && standin_watched == 0)
+    if (fd == SINK_NONE && standin_watched == 0) {
         return;
+    }
     char text[LINE_MAX_SIZE];
     va_list arguments;
     va_start(arguments, format);
     const int length = vsnprintf(text, sizeof text, format, arguments);
     va_end(arguments);
-    if (length < 0)
+    if (length < 0) {
         return;
-    if (standin_watched != 0 && watch(level, file, line, log_id, text))
-        return;
-    if (fd != SINK_NONE)
-        write_line(fd, level, file == nullptr ? "-" : file, line, text);
+    }
+    standin_call(
+        __func__, [&](trace_line &trace) { trace_log(trace, level, file, line, log_id, text); },
+        [&] {
+            if (fd != SINK_NONE) {
+                write_line(fd, level, file == nullptr ? "-" : file, line, text);
+            }
+            return 0;
+        },
+        [](trace_line &trace, int) { trace_close(trace); });
 }

@@ -1,6 +1,7 @@
 #include "kiv/nv.h"
 
 #include "standin.h"
+#include "trace/calls.h"
 
 static int read_key(const char *key, char *buffer, int size)
 {
@@ -14,40 +15,15 @@ static int write_key(const char *key, const char *value, int length)
 
 int kiv_nvconfig_read(const char *key, char *buffer, int size)
 {
-    if (standin_watched == 0)
-        return read_key(key, buffer, size);
-    trace_line line;
-    int result = 0;
-    trace_begin(line, "kiv_nvconfig_read");
-    trace_text(line, key);
-    trace_add(line, ", %d", size);
-    if (trace_fault(line, &result))
-        return result;
-    result = read_key(key, buffer, size);
-    trace_result(line, result);
-    if (result == 0) {
-        trace_add(line, ", ");
-        trace_text(line, buffer);
-    }
-    trace_end(line);
-    return result;
+    return standin_call(
+        __func__, [&](trace_line &line) { trace_nv_read(line, key, size); },
+        [&] { return read_key(key, buffer, size); },
+        [&](trace_line &line, int result) { trace_text_result(line, result, buffer); });
 }
 
 int kiv_nvconfig_write(const char *key, const char *value, int length)
 {
-    if (standin_watched == 0)
-        return write_key(key, value, length);
-    trace_line line;
-    int result = 0;
-    trace_begin(line, "kiv_nvconfig_write");
-    trace_text(line, key);
-    trace_add(line, ", ");
-    trace_text_of(line, value, length > 0 ? static_cast<size_t>(length) : 0);
-    trace_add(line, ", %d", length);
-    if (trace_fault(line, &result))
-        return result;
-    result = write_key(key, value, length);
-    trace_result(line, result);
-    trace_end(line);
-    return result;
+    return standin_call(
+        __func__, [&](trace_line &line) { trace_nv_write(line, key, value, length); },
+        [&] { return write_key(key, value, length); });
 }

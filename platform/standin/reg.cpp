@@ -2,6 +2,7 @@
 
 #include "kiv/socket.h"
 #include "standin.h"
+#include "trace/calls.h"
 
 #include <array>
 #include <cstdio>
@@ -42,19 +43,35 @@ static void clear_folder()
 {
     const int fd = openat(standin_device_dir(), "reg", O_RDONLY | O_DIRECTORY | O_CLOEXEC);
     DIR *folder = fd < 0 ? nullptr : fdopendir(fd);
-    if (folder == nullptr)
+    if (folder == nullptr) {
         return;
+    }
     for (const dirent *entry = readdir(folder); entry != nullptr; entry = readdir(folder)) {
-        if (standin_is_plain_name(entry->d_name))
+        if (standin_is_plain_name(entry->d_name)) {
             unlinkat(fd, entry->d_name, 0);
+        }
     }
     closedir(folder);
 }
 
+// The table belongs to whoever owns the module's queue: a second instance must not empty the first one's.
+static bool own_module(int module_id)
+{
+    char file[64];
+    const char *queue_name = standin_module_queue(module_id);
+    if (queue_name != nullptr) {
+        snprintf(file, sizeof file, "bus/%s", queue_name);
+    } else {
+        snprintf(file, sizeof file, "bus/module-%d", module_id);
+    }
+    return standin_own(file);
+}
+
 static int init_table(int module_id)
 {
-    if (!is_module_id(module_id) || standin_device_dir() < 0)
+    if (!is_module_id(module_id) || !own_module(module_id)) {
         return -1;
+    }
     const std::lock_guard guard(table_lock);
     clear_folder();
     table = {};
@@ -65,8 +82,9 @@ static int init_table(int module_id)
 static registration *find_row(int module_id)
 {
     for (registration &row : table) {
-        if (row.module_id == module_id || row.module_id == 0)
+        if (row.module_id == module_id || row.module_id == 0) {
             return &row;
+        }
     }
     return nullptr;
 }
@@ -75,16 +93,19 @@ static int record_request(int source_module_id, const uint32_t *masks)
 {
     char name[16];
     char text[64];
-    if (!is_module_id(source_module_id) || masks == nullptr)
+    if (!is_module_id(source_module_id) || masks == nullptr) {
         return 0;
+    }
     const std::lock_guard guard(table_lock);
     registration *row = table_ready ? find_row(source_module_id) : nullptr;
-    if (row == nullptr)
+    if (row == nullptr) {
         return 0;
+    }
     snprintf(name, sizeof name, "%d", source_module_id);
     const int length = snprintf(text, sizeof text, "0x%x 0x%x 0x%x 0x%x", masks[0], masks[1], masks[2], masks[3]);
-    if (standin_write_text("reg", name, text, length) != 0)
+    if (standin_write_text("reg", name, text, length) != 0) {
         return 0;
+    }
     row->module_id = source_module_id;
     memcpy(row->masks.data(), masks, sizeof row->masks);
     return 1;
@@ -93,8 +114,9 @@ static int record_request(int source_module_id, const uint32_t *masks)
 static int send_request(int source_module_id, int dest_module_id, const reg_masks *masks)
 {
     const char *queue_name = standin_module_queue(source_module_id);
-    if (queue_name == nullptr || !is_module_id(dest_module_id) || masks == nullptr)
+    if (queue_name == nullptr || !is_module_id(dest_module_id) || masks == nullptr) {
         return -1;
+    }
     const reg_request request = {
         .us_cmd = MSG_CMD_SERVICE_REG,
         .us_reserved1 = 0,
@@ -107,63 +129,22 @@ static int send_request(int source_module_id, int dest_module_id, const reg_mask
     return standin_send(queue_name, &request, sizeof request, STANDIN_SEND_WAIT_MS) == 0 ? 0 : -1;
 }
 
-static void trace_masks(trace_line &line, const uint32_t *masks)
-{
-    if (masks == nullptr)
-        trace_add(line, "null");
-    else
-        trace_add(line, "0x%x 0x%x 0x%x 0x%x", masks[0], masks[1], masks[2], masks[3]);
-}
-
 int kiv_reg_table_init(int module_id)
 {
-    if (standin_watched == 0)
-        return init_table(module_id);
-    trace_line line;
-    int result = 0;
-    trace_begin(line, "kiv_reg_table_init");
-    trace_add(line, "%d", module_id);
-    if (trace_fault(line, &result))
-        return result;
-    result = init_table(module_id);
-    trace_result(line, result);
-    trace_end(line);
-    return result;
+    return standin_call(
+        __func__, [&](trace_line &line) { trace_int(line, module_id); }, [&] { return init_table(module_id); });
 }
 
 int kiv_reg_proc(int source_module_id, const uint32_t *masks)
 {
-    if (standin_watched == 0)
-        return record_request(source_module_id, masks);
-    trace_line line;
-    int result = 0;
-    trace_begin(line, "kiv_reg_proc");
-    trace_add(line, "%d, ", source_module_id);
-    trace_masks(line, masks);
-    if (trace_fault(line, &result))
-        return result;
-    result = record_request(source_module_id, masks);
-    trace_result(line, result);
-    trace_end(line);
-    return result;
+    return standin_call(
+        __func__, [&](trace_line &line) { trace_reg_proc(line, source_module_id, masks); },
+        [&] { return record_request(source_module_id, masks); });
 }
 
 int kiv_reg_func(int source_module_id, int dest_module_id, const reg_masks *masks)
 {
-    if (standin_watched == 0)
-        return send_request(source_module_id, dest_module_id, masks);
-    trace_line line;
-    int result = 0;
-    uint32_t words[4] = {};
-    if (masks != nullptr)
-        memcpy(words, masks, sizeof words);
-    trace_begin(line, "kiv_reg_func");
-    trace_add(line, "%d, %d, ", source_module_id, dest_module_id);
-    trace_masks(line, masks != nullptr ? words : nullptr);
-    if (trace_fault(line, &result))
-        return result;
-    result = send_request(source_module_id, dest_module_id, masks);
-    trace_result(line, result);
-    trace_end(line);
-    return result;
+    return standin_call(
+        __func__, [&](trace_line &line) { trace_reg_func(line, source_module_id, dest_module_id, masks); },
+        [&] { return send_request(source_module_id, dest_module_id, masks); });
 }

@@ -1,38 +1,45 @@
 #include "policy/cpe/battery.h"
 
-#include "core/led_log.h"
-#include "core/nv_read.h"
+#include "ground/led_log.h"
+#include "ground/nv_read.h"
 #include "kiv/adabsp.h"
 #include "policy/cpe/setters.h"
 #include "policy/cpe/state.h"
 
-#include <array>
-#include <climits>
+constexpr char LED_LOG_SOURCE[] = "kiv_mirta_led_cpe";
 
-constexpr char led_log_source[] = "kiv_mirta_led_cpe";
+constexpr int LOW_UP_TO_PERCENT = 20;
+constexpr int MIDDLE_UP_TO_PERCENT = 50;
 
-enum charging_text : int { TEXT_CHARGING = 1, TEXT_NO_BATTERY = 3 }; // NV "battery_charging"
-
-struct level_row {
-    int up_to_percent;
-    cpe_battery_status discharging;
-    cpe_battery_status charging;
-};
-
-constexpr auto level_rows = std::array{
-    level_row{20,      CPE_BAT_LOW,    CPE_BAT_CHARGING_LOW   },
-    level_row{50,      CPE_BAT_MIDDLE, CPE_BAT_CHARGING_MIDDLE},
-    level_row{INT_MAX, CPE_BAT_HIGH,   CPE_BAT_CHARGING_HIGH  },
-};
+// NV "battery_charging"; any other number is a battery that does not charge.
+enum battery_charging : int { BATTERY_CHARGING = 1, BATTERY_NOT_SHOWN = 3 };
 
 static cpe_battery_status status_of_level(int percent, bool charging)
 {
-    for (const level_row &row : level_rows) {
-        if (percent <= row.up_to_percent) {
-            return charging ? row.charging : row.discharging;
-        }
+    if (percent <= LOW_UP_TO_PERCENT) {
+        return charging ? CPE_BAT_CHARGING_LOW : CPE_BAT_LOW;
     }
-    return CPE_BAT_NOTHING;
+    if (percent <= MIDDLE_UP_TO_PERCENT) {
+        return charging ? CPE_BAT_CHARGING_MIDDLE : CPE_BAT_MIDDLE;
+    }
+    return charging ? CPE_BAT_CHARGING_HIGH : CPE_BAT_HIGH;
+}
+
+// 1 when the board says that a battery is there, 0 when there is none or the board does not answer.
+static int getBatteryExist()
+{
+    LED_INFO("[info] enter getBatteryExist");
+
+    bsp_query_result result = {};
+    if (kiv_bsp_get_battery_online_status_sync(&result) != 0) {
+        return 0;
+    }
+    LED_INFO("[info] isBattExist ret %d,data %d!!", result.ret, result.data);
+    if (result.ret != 0) {
+        LED_ERROR("getBatteryExist error = %d", result.ret);
+        return 0;
+    }
+    return result.data == 1 ? 1 : 0;
 }
 
 static cpe_battery_status read_battery_status()
@@ -49,10 +56,10 @@ static cpe_battery_status read_battery_status()
     const nv_text percent = kiv_led_read_nv_text("battery_value");
     LED_INFO("kiv_cpe_led_handle_battery_state buf_percent = %s", percent.data());
 
-    if (charging == TEXT_NO_BATTERY) {
+    if (charging == BATTERY_NOT_SHOWN) {
         return CPE_BAT_NONE;
     }
-    return status_of_level(kiv_led_text_to_int(percent.data()), charging == TEXT_CHARGING);
+    return status_of_level(kiv_led_text_to_int(percent.data()), charging == BATTERY_CHARGING);
 }
 
 void kiv_cpe_led_handle_battery_state()
@@ -79,27 +86,11 @@ void getChargerConnect()
     bsp_query_result result = {};
     if (kiv_bsp_get_charger_connect_status_sync(&result) == 0) {
         LED_INFO("[info] isUsbCharged ret %d,data %d!!", result.ret, result.data);
-        if (result.ret == 0 && (result.data == 0 || result.data == 1)) {
+        if (result.ret == 0 && (result.data == CHARGER_DISCONNECTED || result.data == CHARGER_CONNECTED)) {
             cur_cpe_charger_state = result.data;
         }
     }
     const int charger = cur_cpe_charger_state;
     LED_INFO("getChargerConnect: %d", charger);
     kiv_cpe_led_handle_charger_state(charger);
-}
-
-int getBatteryExist()
-{
-    LED_INFO("[info] enter getBatteryExist");
-
-    bsp_query_result result = {};
-    if (kiv_bsp_get_battery_online_status_sync(&result) != 0) {
-        return 0;
-    }
-    LED_INFO("[info] isBattExist ret %d,data %d!!", result.ret, result.data);
-    if (result.ret != 0) {
-        LED_ERROR("getBatteryExist error = %d", result.ret);
-        return 0;
-    }
-    return result.data == 1 ? 1 : 0;
 }

@@ -6,11 +6,8 @@
 // change.
 void kiv_cpe_led_handle_battery_state();
 
-// state: 1 connected, 0 not, 2 not yet known. Remembered and shown in every power state.
+// state: charger_state. Remembered and shown in every power state.
 void kiv_cpe_led_handle_charger_state(int state);
 
 // Asks the board for the charger and handles the answer; without a valid one the remembered state is handled again.
 void getChargerConnect();
-
-// Asks the board for the battery: 1 present, 0 absent or unknown.
-int getBatteryExist();

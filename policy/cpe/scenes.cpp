@@ -1,34 +1,18 @@
 #include "policy/cpe/scenes.h"
 
-#include "core/led_log.h"
-#include "core/reverser.h"
+#include "ground/led_log.h"
+#include "ground/reverser.h"
 #include "kiv/reg.h"
-#include "policy/battery_query.h"
+#include "kiv/socket.h"
+#include "policy/common/network.h"
 #include "policy/cpe/battery.h"
 #include "policy/cpe/setters.h"
 #include "policy/cpe/state.h"
-#include "policy/mc_event.h"
-#include "policy/standard/network.h"
+#include "policy/products.h"
 
-#include <array>
 #include <cstdlib>
 
-constexpr char led_log_source[] = "kiv_mirta_led_cpe";
-
-// clang-format off
-constexpr auto mc_event_rows = std::array{
-    mc_event_row{REG_MC_EVENT_POWERON, "recv REG_MC_EVENT_POWERON \n", kiv_cpe_led_set_led_when_power_on},
-    mc_event_row{REG_MC_EVENT_SHUTTING_DOWN, "recv REG_MC_EVENT_SHUTTING_DOWN \n", kiv_cpe_led_set_led_when_power_off,
-                 REVERSER_SHUTTING_DOWN},
-    mc_event_row{REG_MC_EVENT_RESTARTING, "recv REG_MC_EVENT_RESTARTING \n", kiv_cpe_led_set_all_leds_off},
-    mc_event_row{REG_MC_EVENT_POWER_OFF_UNREADL, "recv REG_MC_EVENT_POWER_OFF_UNREADL \n",
-                 kiv_cpe_led_set_led_when_power_off_unreal},
-    mc_event_row{REG_MC_EVENT_POWER_OFF_CHARGE, "recv REG_MC_EVENT_POWER_OFF_CHARGE \n",
-                 kiv_cpe_led_set_led_when_power_off_charge},
-    mc_event_row{REG_MC_CHARGIN_STATUS, "recv REG_MC_CHARGIN_STATUS\n", kiv_cpe_led_handle_battery_state},
-    mc_event_row{REG_MC_BATTERY_VALUE, "recv REG_MC_BATTERY_VALUE\n", kiv_cpe_led_handle_battery_state},
-};
-// clang-format on
+constexpr char LED_LOG_SOURCE[] = "kiv_mirta_led_cpe";
 
 static void enter_power_state(power_state state)
 {
@@ -43,27 +27,10 @@ static void power_wifi_leds()
     [[maybe_unused]] const int result = std::system("echo 1 > /sys/class/leds/led:wifi_power_ctrl/brightness");
 }
 
-void kiv_cpe_led_handle_mc_event(uint32_t event)
-{
-    kiv_led_run_mc_event(mc_event_rows, event, led_log_source);
-}
-
-void kiv_cpe_led_set_led_when_sleep_status_change(int sleep_status)
-{
-    LED_INFO("enter kiv_led_set_led_when_sleep_status_change sleep_status=%d\n", sleep_status);
-}
-
-void kiv_led_cpe_init()
-{
-    LED_INFO("kiv_led_cpe_init!");
-    getChargerConnect();
-    kiv_cpe_led_handle_battery_state();
-    recv_nwNetType();
-    recv_nwSigStatus();
-}
-
-// Shows what is remembered, then reads it again: until the network answers that is no service.
-void kiv_cpe_led_set_led_when_power_on()
+// Shows what is remembered, then reads it again: before the first network notification that is no service. What changed
+// while the terminal was off was dropped, so roaming, network type and signal are read from NV, in the order in which
+// each handler finds the others' values settled.
+static void kiv_cpe_led_set_led_when_power_on()
 {
     LED_INFO("enter kiv_led_set_led_when_power_on\n");
     cur_cpe_power_state = POWER_ON;
@@ -79,13 +46,13 @@ void kiv_cpe_led_set_led_when_power_on()
     power_wifi_leds();
 }
 
-void kiv_cpe_led_set_led_when_power_off()
+static void kiv_cpe_led_set_led_when_power_off()
 {
     LED_INFO("enter kiv_led_set_led_when_power_off\n");
     enter_power_state(POWER_OFF);
 }
 
-void kiv_cpe_led_set_led_when_power_off_unreal()
+static void kiv_cpe_led_set_led_when_power_off_unreal()
 {
     LED_INFO("enter kiv_cpe_led_set_led_when_power_off_unreal\n");
     enter_power_state(POWER_OFF_UNREAL);
@@ -93,11 +60,62 @@ void kiv_cpe_led_set_led_when_power_off_unreal()
 
 // The battery LEDs end dark: their setter shows nothing unless the device is on. Only the power LED follows the
 // charger.
-void kiv_cpe_led_set_led_when_power_off_charge()
+static void kiv_cpe_led_set_led_when_power_off_charge()
 {
     LED_INFO("enter kiv_led_set_led_when_power_off_charge\n");
     enter_power_state(POWER_OFF_CHARGE);
     getChargerConnect();
     kiv_led_battery_query_dispatch();
     kiv_cpe_led_set_bat_status(cur_cpe_battery_status, POWER_OFF_CHARGE);
+}
+
+void kiv_cpe_led_handle_mc_event(uint32_t event)
+{
+    switch (event) {
+    case REG_MC_EVENT_POWERON:
+        LED_INFO("recv REG_MC_EVENT_POWERON \n");
+        kiv_cpe_led_set_led_when_power_on();
+        break;
+    case REG_MC_EVENT_SHUTTING_DOWN:
+        LED_INFO("recv REG_MC_EVENT_SHUTTING_DOWN \n");
+        kiv_cpe_led_set_led_when_power_off();
+        kiv_led_send_common_reverser_msg(KIV_MODULE_MAIN, REVERSER_SHUTTING_DOWN);
+        break;
+    case REG_MC_EVENT_RESTARTING:
+        LED_INFO("recv REG_MC_EVENT_RESTARTING \n");
+        kiv_cpe_led_set_all_leds_off();
+        break;
+    case REG_MC_EVENT_POWER_OFF_UNREADL:
+        LED_INFO("recv REG_MC_EVENT_POWER_OFF_UNREADL \n");
+        kiv_cpe_led_set_led_when_power_off_unreal();
+        break;
+    case REG_MC_EVENT_POWER_OFF_CHARGE:
+        LED_INFO("recv REG_MC_EVENT_POWER_OFF_CHARGE \n");
+        kiv_cpe_led_set_led_when_power_off_charge();
+        break;
+    case REG_MC_CHARGIN_STATUS:
+        LED_INFO("recv REG_MC_CHARGIN_STATUS\n");
+        kiv_cpe_led_handle_battery_state();
+        break;
+    case REG_MC_BATTERY_VALUE:
+        LED_INFO("recv REG_MC_BATTERY_VALUE\n");
+        kiv_cpe_led_handle_battery_state();
+        break;
+    default: // of no concern to the LEDs of this product
+        break;
+    }
+}
+
+void kiv_cpe_led_set_led_when_sleep_status_change(int sleep_status)
+{
+    LED_INFO("enter kiv_led_set_led_when_sleep_status_change sleep_status=%d\n", sleep_status);
+}
+
+void kiv_led_cpe_init()
+{
+    LED_INFO("kiv_led_cpe_init!");
+    getChargerConnect();
+    kiv_cpe_led_handle_battery_state();
+    recv_nwNetType();
+    recv_nwSigStatus();
 }

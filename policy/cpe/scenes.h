@@ -1,4 +1,4 @@
-// The module CPE's power transitions. All run on the receive thread; kiv_led_cpe_init on the main thread at start.
+// The module CPE's power transitions. Receive thread.
 #pragma once
 
 #include <cstdint>
@@ -9,10 +9,5 @@ void kiv_cpe_led_handle_mc_event(uint32_t event);
 // Sleep and wake-up change no LED on this product: only logged.
 void kiv_cpe_led_set_led_when_sleep_status_change(int sleep_status);
 
-// The initial scene: the charger's LED; the others wait for power-on.
+// The initial scene: the charger's LED; the others wait for power-on. Main thread.
 void kiv_led_cpe_init();
-
-void kiv_cpe_led_set_led_when_power_on();
-void kiv_cpe_led_set_led_when_power_off();
-void kiv_cpe_led_set_led_when_power_off_unreal();
-void kiv_cpe_led_set_led_when_power_off_charge();

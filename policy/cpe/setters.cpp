@@ -1,14 +1,16 @@
 #include "policy/cpe/setters.h"
 
-#include "core/led_ctx.h"
-#include "core/led_log.h"
+#include "ground/led_ctx.h"
+#include "ground/led_log.h"
 #include "kiv/adabsp.h"
 #include "output/led_groups.h"
-#include "policy/standard/net_led.h"
+#include "painters/net_led.h"
+#include "policy/common/voice.h"
+#include "policy/cpe/state.h"
 
 #include <array>
 
-constexpr char led_log_source[] = "kiv_mirta_led_set_status";
+constexpr char LED_LOG_SOURCE[] = "kiv_mirta_led_set_status";
 
 struct net_row {
     int type;
@@ -45,7 +47,7 @@ constexpr auto battery_rows = std::array{
     battery_row{CPE_BAT_CHARGING_LOW,    {LED_BAT_RED, LED_OP_BLINK, 1000, 1000, 1}   },
 };
 
-// By phone state.
+// By phone_state.
 constexpr auto voice_steps = std::array{
     led_step{LED_VOICE_BLUE, LED_OP_OFF,   0,    0,    0},
     led_step{LED_VOICE_BLUE, LED_OP_ON,    0,    0,    4},
@@ -57,7 +59,7 @@ void kiv_cpe_set_led_net_led_status(int type, int roam)
     LED_INFO("kiv_cpe_set_led_net_led_status: type = %d, roam = %d", type, roam);
     for (const net_row &row : net_rows) {
         if (row.type == type) {
-            kiv_led_apply(kiv_led_set_net_led_operation, roam == 0 ? row.home : row.roaming);
+            kiv_led_set_net_led_operation(roam == 0 ? row.home : row.roaming);
         }
     }
 }
@@ -66,9 +68,9 @@ void kiv_cpe_set_led_sig_led_status(int type, int sig, int roam)
 {
     LED_INFO("kiv_cpe_set_led_sig_led_status: type = %d, sig = %d,roam = %d", type, sig, roam);
     if (type == NET_NO_SERVICE) {
-        kiv_led_apply(kiv_led_set_voice_led_operation, no_service_step);
+        kiv_led_set_voice_led_operation(no_service_step);
     } else if (static_cast<unsigned>(sig) < signal_steps.size()) {
-        kiv_led_apply(kiv_led_set_voice_led_operation, signal_steps[static_cast<unsigned>(sig)]);
+        kiv_led_set_voice_led_operation(signal_steps[static_cast<unsigned>(sig)]);
     }
 }
 
@@ -81,34 +83,34 @@ void kiv_cpe_led_set_bat_status(int status, int power_state)
     }
     for (const battery_row &row : battery_rows) {
         if (row.status == status) {
-            kiv_led_apply(kiv_led_set_bat_led_operation, row.step);
+            kiv_led_set_bat_led_operation(row.step);
         }
     }
 }
 
 // The power group accepts LED_POWER_BLUE only, so a connected charger is refused there and shows nothing.
-void kiv_cpe_led_set_power_status(int charger_state)
+void kiv_cpe_led_set_power_status(int charger)
 {
-    if (charger_state == 1) {
+    if (charger == CHARGER_CONNECTED) {
         kiv_led_set_power_led_operation(LED_POWER_54, LED_OP_ON, 0, 0, 1);
     } else {
         kiv_led_set_power_led_off();
     }
 }
 
-void kiv_cpe_led_set_voicemail_status(int voicemail_state)
+void kiv_cpe_led_set_voicemail_status(int voicemail)
 {
-    if (voicemail_state == 1) {
+    if (voicemail == 1) {
         kiv_led_set_voicemail_led_operation(LED_VOICEMAIL_GREEN, LED_OP_BLINK, 1000, 1000, 1);
     } else {
         kiv_led_set_voicemail_led_operation(LED_VOICEMAIL_GREEN, LED_OP_OFF, 0, 0, 0);
     }
 }
 
-void kiv_cpe_led_set_voice_status(int phone_state)
+void kiv_cpe_led_set_voice_status(int phone)
 {
-    if (static_cast<unsigned>(phone_state) < voice_steps.size()) {
-        kiv_led_apply(kiv_led_set_voice_led_operation, voice_steps[static_cast<unsigned>(phone_state)]);
+    if (static_cast<unsigned>(phone) < voice_steps.size()) {
+        kiv_led_set_voice_led_operation(voice_steps[static_cast<unsigned>(phone)]);
     }
 }
 

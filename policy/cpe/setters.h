@@ -6,9 +6,9 @@
 void kiv_cpe_set_led_net_led_status(int type, int roam);          // type: net_class; roam: 0 home; 5G shows nothing
 void kiv_cpe_set_led_sig_led_status(int type, int sig, int roam); // sig: bars, 0 to 5; roam is only logged
 void kiv_cpe_led_set_bat_status(int status, int power_state);     // cpe_battery_status; dark unless POWER_ON
-void kiv_cpe_led_set_power_status(int charger_state);             // 1 charger connected
-void kiv_cpe_led_set_voicemail_status(int voicemail_state);       // 1 voicemail waiting
-void kiv_cpe_led_set_voice_status(int phone_state);               // 0 dark, 1 lit, 2 blinking; others change nothing
+void kiv_cpe_led_set_power_status(int charger);                   // charger_state, policy/cpe/state.h
+void kiv_cpe_led_set_voicemail_status(int voicemail);             // 1 voicemail waiting
+void kiv_cpe_led_set_voice_status(int phone);                     // phone_state; others change nothing
 void kiv_cpe_led_set_all_leds_off(); // battery, net, voice and voicemail; not the power LED
 
 enum cpe_battery_status : int {

@@ -1,10 +1,10 @@
 #include "policy/cpe/state.h"
 
-#include "policy/standard/net_led.h"
+#include "painters/net_led.h"
 
 constinit led_word cur_cpe_power_state;
 constinit led_word cur_cpe_net_type{NET_NO_SERVICE};
-constinit led_word cur_cpe_charger_state{2};
+constinit led_word cur_cpe_charger_state{CHARGER_UNKNOWN};
 constinit led_word cur_cpe_ppp_status;
 constinit led_word cur_cpe_roam_status;
 constinit led_word cur_cpe_signal_state;

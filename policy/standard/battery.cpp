@@ -1,15 +1,15 @@
 #include "policy/standard/battery.h"
 
-#include "core/led_ctx.h"
-#include "core/led_log.h"
-#include "core/nv_read.h"
+#include "ground/led_ctx.h"
+#include "ground/led_log.h"
+#include "ground/nv_read.h"
 #include "kiv/adabsp.h"
 #include "output/led_groups.h"
 
 #include <array>
 #include <climits>
 
-constexpr char led_log_source[] = "kiv_mirta_led";
+constexpr char LED_LOG_SOURCE[] = "kiv_mirta_led";
 
 enum charging_status : int { NOT_CHARGING = 0, CHARGING = 1, CHARGED = 2, NO_BATTERY = 3 };
 
@@ -25,29 +25,24 @@ constexpr auto charge_rows = std::array{
     charge_row{INT_MAX, "power green on,power_percent=",  {LED_BAT_GREEN, LED_OP_ON, 0, 0, 4}      },
 };
 
-static bool shows_battery_in(int state)
+static void kiv_led_set_led_when_power_percent_change()
 {
-    return state == POWER_ON || state == POWER_OFF_CHARGE || state == POWER_OFF_CHARGE_QUICKEN;
+    LED_INFO("enter kiv_led_set_led_when_power_percent_change\n");
+
+    const nv_text text = kiv_led_read_nv_text("battery_value");
+    LED_INFO("kiv_led_set_led_when_power_percent_change buf_percent = %s", text.data());
+
+    const int percent = kiv_led_text_to_int(text.data());
+    for (const charge_row &row : charge_rows) {
+        if (percent <= row.up_to_percent) {
+            LED_INFO("%s%d\n", row.line, percent);
+            kiv_led_set_bat_led_operation(row.step);
+            return;
+        }
+    }
 }
 
-void kiv_led_query_battery_state()
-{
-    if (cur_led_sleep_status == 1) {
-        LED_INFO("recv_battery_state, KIV_LED_SLEEP");
-        return;
-    }
-    if (!shows_battery_in(led_power_state)) {
-        return;
-    }
-    const int charging = kiv_led_read_nv_int("battery_charging");
-    const int exist = kiv_led_read_nv_int("battery_exist");
-    const int status = exist == 0 ? NO_BATTERY : charging;
-
-    LED_INFO("kiv_led_query_battery_state battery_charging = %d", status);
-    kiv_led_set_led_when_charging_status_change(status);
-}
-
-void kiv_led_set_led_when_charging_status_change(int charging_status)
+static void kiv_led_set_led_when_charging_status_change(int charging_status)
 {
     LED_INFO("enter kiv_led_set_led_when_charging_status_change charging_status=%d\n", charging_status);
     switch (charging_status) {
@@ -70,19 +65,24 @@ void kiv_led_set_led_when_charging_status_change(int charging_status)
     }
 }
 
-void kiv_led_set_led_when_power_percent_change()
+static bool shows_battery_in(int state)
 {
-    LED_INFO("enter kiv_led_set_led_when_power_percent_change\n");
+    return state == POWER_ON || state == POWER_OFF_CHARGE || state == POWER_OFF_CHARGE_QUICKEN;
+}
 
-    const nv_text text = kiv_led_read_nv_text("battery_value");
-    LED_INFO("kiv_led_set_led_when_power_percent_change buf_percent = %s", text.data());
-
-    const int percent = kiv_led_text_to_int(text.data());
-    for (const charge_row &row : charge_rows) {
-        if (percent <= row.up_to_percent) {
-            LED_INFO("%s%d\n", row.line, percent);
-            kiv_led_apply(kiv_led_set_bat_led_operation, row.step);
-            return;
-        }
+void kiv_led_query_battery_state()
+{
+    if (cur_led_sleep_status == ASLEEP) {
+        LED_INFO("recv_battery_state, KIV_LED_SLEEP");
+        return;
     }
+    if (!shows_battery_in(led_power_state)) {
+        return;
+    }
+    const int charging = kiv_led_read_nv_int("battery_charging");
+    const int exist = kiv_led_read_nv_int("battery_exist");
+    const int status = exist == 0 ? NO_BATTERY : charging;
+
+    LED_INFO("kiv_led_query_battery_state battery_charging = %d", status);
+    kiv_led_set_led_when_charging_status_change(status);
 }

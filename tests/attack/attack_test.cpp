@@ -1,10 +1,10 @@
 // The real daemon in real time, on the simulator's device and with its other ends of the bus.
-#include "device.h"
 #include "kiv/reg.h"
 #include "kiv/socket.h"
-#include "messages.h"
+#include "language/messages.h"
 #include "rig.h"
 #include "standin.h"
+#include "world/device.h"
 
 #include <atomic>
 #include <chrono>
@@ -39,8 +39,9 @@ struct attack : testing::Test {
     {
         close();
         umount2(disk.c_str(), MNT_DETACH);
-        for (const char *file : {"", ".trace"})
+        for (const char *file : {"", ".trace"}) {
             remove_device(disk.empty() ? disk : disk + file);
+        }
     }
 
     void open(const char *product)
@@ -71,8 +72,9 @@ struct attack : testing::Test {
     bool shows(const std::string &text, size_t from = 0) const
     {
         bool shown = false;
-        for (int tries = 0; !shown && tries < 5000; tries++, std::this_thread::sleep_for(2ms))
+        for (int tries = 0; !shown && tries < 5000; tries++, std::this_thread::sleep_for(2ms)) {
             shown = trace(from).find(text) != std::string::npos;
+        }
         return shown;
     }
     void launch() { ASSERT_TRUE(::launch(r.process, r.options, r.device, r.trace_path, 0, 0, error)) << error; }
@@ -83,7 +85,7 @@ struct attack : testing::Test {
         launch();
         return shows("kiv_send_msg(\"MSG_ID_DAEMON\", 104) = 0", before) && post(start_record());
     }
-    bool answers() const
+    bool answers()
     {
         const size_t before = trace_size();
         drain(r.wires);
@@ -97,8 +99,9 @@ static void flood(unsigned seed, const std::atomic<bool> &stop, std::atomic<long
     std::minstd_rand random(seed);
     unsigned char bytes[KIV_SVC_MSG_SIZE];
     while (!stop) {
-        for (unsigned char &byte : bytes)
+        for (unsigned char &byte : bytes) {
             byte = static_cast<unsigned char>(random());
+        }
         svc_msg &message = *reinterpret_cast<svc_msg *>(bytes);
         message.us_dest_module_id = KIV_MODULE_LED;
         message.us_cmd = random() % 2 == 0 ? static_cast<uint16_t>(MSG_CMD_SERVICE_NOTIFY) : message.us_cmd;
@@ -122,8 +125,9 @@ TEST_F(attack, FloodLosesNoAcceptedNotification)
     std::thread first([&] { flood(1, stop, junk); });
     std::thread second([&] { flood(2, stop, junk); });
     std::thread module([&] {
-        for (int i = 0; i < notifications; i++)
+        for (int i = 0; i < notifications; i++) {
             accepted += post(question);
+        }
         stop = true;
     });
     for (int quiet_ms = 0; quiet_ms < 3000 && answered <= notifications; std::this_thread::sleep_for(1ms)) {
@@ -148,19 +152,22 @@ TEST_F(attack, NvFileReplacedWhileRead)
     write("nv/battery_value", texts[0]);
     ASSERT_TRUE(start());
     std::thread writer([&] {
-        for (int i = 1; !stop; i++)
+        for (int i = 1; !stop; i++) {
             write("nv/battery_value", texts[i % 2]);
+        }
     });
     EXPECT_TRUE(post(notification(KIV_MODULE_MAIN, REG_MC_EVENT_POWERON, "")));
-    for (int i = 0; i < 1000; i++)
+    for (int i = 0; i < 1000; i++) {
         EXPECT_TRUE(post(notification(KIV_MODULE_MAIN, REG_MC_BATTERY_VALUE, "")));
+    }
     EXPECT_TRUE(answers());
     stop = true;
     writer.join();
 
     for (const trace_entry &entry : read_trace(r.trace)) {
-        if (entry.call == "kiv_nvconfig_read" && entry.arguments.starts_with("\"battery_value\""))
+        if (entry.call == "kiv_nvconfig_read" && entry.arguments.starts_with("\"battery_value\"")) {
             reads[entry.result]++;
+        }
     }
     const int low = reads["0, \"" + texts[0] + "\""];
     const int full = reads["0, \"" + texts[1] + "\""];
@@ -174,8 +181,9 @@ TEST_F(attack, FullDiskOfTheDeviceDirectory)
 {
     close();
     disk = make_device(error);
-    if (mount("tmpfs", disk.c_str(), "tmpfs", 0, "size=256k,mode=0700") != 0)
+    if (mount("tmpfs", disk.c_str(), "tmpfs", 0, "size=256k,mode=0700") != 0) {
         GTEST_SKIP() << "only root can mount a small disk";
+    }
     setenv("TMPDIR", disk.c_str(), 1);
     open("DRIVER_UFI");
     unsetenv("TMPDIR"); // a sanitizer in the daemon has files of its own there
@@ -224,12 +232,14 @@ TEST_F(attack, KilledAnywhereAnswersAfterRestart)
     for (int i = 0; i < kills; i++) {
         const unsigned long sent = random() % (4 * std::size(story));
         const auto pause = std::chrono::microseconds(random() % 3000);
-        if (random() % 4 == 0)
+        if (random() % 4 == 0) {
             launch(); // dies before it is asked to start
-        else
+        } else {
             ASSERT_TRUE(start()) << "kill " << i;
-        for (unsigned long at = 0; at < sent; at++)
+        }
+        for (unsigned long at = 0; at < sent; at++) {
             post(story[at % std::size(story)]);
+        }
         std::this_thread::sleep_for(pause);
         kill_daemon(r.process);
         ASSERT_TRUE(start()) << "after kill " << i;

@@ -2,20 +2,14 @@
 // must not outlast the next time that the device is switched off and on.
 #include "fake_platform.h"
 
-#include "alarms/kiv_led_data_limit.h"
-#include "alarms/kiv_led_over_temp.h"
+#include "boot.h"
 #include "core/channel.h"
-#include "core/led_ctx.h"
+#include "ground/led_ctx.h"
 #include "kiv/ipc.h"
 #include "kiv/nv.h"
 #include "kiv/reg.h"
 #include "kiv/tr181.h"
-#include "nightmode/kiv_led_night_mode.h"
 #include "nightmode/kiv_led_tr181.h"
-#include "policy/cpe/state.h"
-#include "policy/initial_scenes.h"
-#include "policy/standard/sms.h"
-#include "policy/standard/voice.h"
 
 #include <cstring>
 #include <gtest/gtest.h>
@@ -31,8 +25,9 @@ static std::array<std::map<int, std::string>, LED_PRODUCT_COUNT> leds; // as las
 static bool fails(const char *call)
 {
     made[call]++;
-    if (failing_call != call)
+    if (failing_call != call) {
         return false;
+    }
     failed = failed || countdown == 0;
     return countdown-- == 0;
 }
@@ -126,15 +121,20 @@ static void play(std::span<const story_row> rows)
         message.ul_event_mask = row.event;
         strcpy(message.p_data, row.text);
         fake_platform().inbox.emplace_back(std::string(reinterpret_cast<char *>(&message), sizeof message));
-        while (!fake_platform().inbox.empty())
+        while (!fake_platform().inbox.empty()) {
             kiv_led_receive_message(received);
+        }
         const std::map<int, fake_timer> timers = fake_platform().timers;
-        for (const auto &[handle, timer] : timers)
+        for (const auto &[handle, timer] : timers) {
             fake_fire(handle);
+        }
     }
 }
 
-static void prepare(int product)
+static const std::array<std::string, LED_PRODUCT_COUNT> product_types = {"DRIVER_UFI", "ONLY_DATA_CARD", "PAPER_KITE",
+                                                                         "MODULE", "UNI_CORE_CPE"};
+
+static void prepare()
 {
     fake_device &device = fake_platform();
     device = {};
@@ -142,14 +142,13 @@ static void prepare(int product)
                              "wifi_onoff_state=1 thermal_led_enable=40 night_mode_switch=1 syn_done=1 "
                              "night_mode_start_time=22:00 night_mode_end_time=06:00 data_volume_limit_switch=1 "
                              "data_volume_limit_unit=data data_volume_limit_size=1 sms_nvunread_count=0");
-    for (std::string key, value; std::getline(pairs >> std::ws, key, '=') && pairs >> value;)
+    for (std::string key, value; std::getline(pairs >> std::ws, key, '=') && pairs >> value;) {
         device.nv[key] = value;
+    }
     device.sensors.fill(45);
     device.charger = {0, 1};
     device.battery = {0, 1};
     device.clock = 12 * 60 * 60;
-    led_enable = 1;
-    led_product_type = product;
 }
 
 struct outcome {
@@ -161,13 +160,13 @@ struct outcome {
 
 static outcome run(int product, const std::string &call, int fail_at)
 {
-    prepare(product);
+    prepare();
     failing_call = call;
     countdown = fail_at;
     made.clear();
     failed = false;
     fake_record(true);
-    kiv_led_init();
+    EXPECT_EQ(boot(product_types[static_cast<size_t>(product)]), 0);
     play(story);
     kiv_tr181_led_init(nullptr);
     const std::map<std::string, int> calls = made;
@@ -201,6 +200,7 @@ TEST(fault_sweep, NoFailureOutlastsSwitchingOffAndOn)
         }
     }
     EXPECT_EQ(swept.size(), 12U) << "one of them is never called";
-    for (const auto &[call, failures] : swept)
+    for (const auto &[call, failures] : swept) {
         EXPECT_GT(failures, 0) << call;
+    }
 }

@@ -1,33 +1,57 @@
-// Runs each case in a process of its own, so that every case meets a daemon that has just booted, and compares the
-// platform calls that it made with the expected ones.
+// Drives the daemon as the device does and compares what it did with what was expected, both in the words of scenarios
+// and traces: a line a platform call, "net_red on 2" for an LED request, "info SOURCE "TEXT"" or "error ..." for a log
+// line (tests/fake tells the others).
 #pragma once
 
-#include "core/led_ctx.h"
 #include "fake_platform.h"
+#include "ground/led_ctx.h"
+#include "kiv/reg.h"
 #include "kiv/socket.h"
 
 #include <cstdint>
+#include <functional>
+#include <gtest/gtest.h>
+#include <source_location>
 #include <string>
 
-// Expected calls stand one a line, or several a line with " | " between them. "net off", and so on with bat, sms,
-// voice, voicemail and handheld, stand for the requests that switch the whole group off.
-using script = void();
-void expect_calls(const char *name, const std::string &expected, script *play);   // every call
-void expect_logs(const char *name, const std::string &expected, script *play);    // the log lines
-void expect_errors(const char *name, const std::string &expected, script *play);  // those of level 0
-void expect_effects(const char *name, const std::string &expected, script *play); // all but logs and what is only read
+// A test that meets a daemon that has just booted: it runs in a process of its own.
+#define DEVICE_TEST(suite, name)                                                                                       \
+    static void suite##_##name();                                                                                      \
+    TEST(suite, name)                                                                                                  \
+    {                                                                                                                  \
+        on_a_fresh_device(#name, suite##_##name);                                                                      \
+    }                                                                                                                  \
+    static void suite##_##name()
 
-// What a script is made of.
-void product_on(led_product product); // the LED function on, the device on
-void nv(const char *key, const char *value);
-void forget();                                                            // what came before is not compared
-void receive(const std::string &bytes);                                   // one turn of the receive thread
-void notify(int source, uint32_t event, const std::string &payload = ""); // to module 38
-void mc(uint32_t event);                                                  // by the main-control module
+// The same for a part of a test. What fails in it fails the test.
+void on_a_fresh_device(const std::string &name, const std::function<void()> &play);
+
+// Each compares a view of everything since the step before the last expectation with the expected lines. A message
+// leaves the same lines on its way to whatever handles it; only expect_trace shows them. "net off" stands for the
+// requests that switch off each LED of the group (bat, sms, flow, rssi, voice, voicemail and sigbar likewise; "handheld
+// off" is every LED of the handheld), "only net_red on 2" for those and the request that follows them.
+using source_place = std::source_location;
+void expect_trace(const std::string &expected, source_place where = source_place::current());   // every call
+void expect_calls(const std::string &expected, source_place where = source_place::current());   // from the handler on
+void expect_effects(const std::string &expected, source_place where = source_place::current()); // no logs, no reads
+void expect_errors(const std::string &expected, source_place where = source_place::current());  // log lines of level 0
+// The log lines of one source, without its name.
+void expect_log(const std::string &source, const std::string &expected, source_place where = source_place::current());
+
+// What the device is like; done between steps.
+void switched_on(led_product product); // by hand: the LED function on, the device on
+void nv(const std::string &key, const std::string &value);
+void utc(int hour, int minute);
+void forget(); // what came before is not compared
+
+// Steps.
+void start(const std::string &product_type, char led_function = 1); // the whole start-up, without its threads
+void notify(int module, uint32_t event, const std::string &payload = "");
 void command(int us_cmd);
-std::string message_bytes(int us_cmd, int dest, int source, uint32_t event, const std::string &payload = "");
-void at_utc(int hour, int minute);
-void note_power(); // "power P sleep S"
+void receive(const std::string &bytes); // one turn of the receive thread
+void fire_timers(int period_ms);        // every timer of that period that runs, once
+void indicate(int event_id);            // the board's callback as it was registered
+void step(const std::function<void()> &calls);
 
-// The reverser message, but for its value and the quotation mark that ends it.
-inline const std::string reverser = R"(send 1 8 0:"\x02/" 4:"\x01" 6:"&" 8:"\x08" 15:" )";
+std::string message_bytes(int us_cmd, int dest, int source, uint32_t event, const std::string &payload = "");
+fake_timer running_timer(int period_ms); // there must be one

@@ -1,158 +1,403 @@
 // The indications that products share: network, signal, Wi-Fi, SMS, voicemail and phone.
 #include "harness.h"
-#include "policy/standard/signal_led.h"
-#include "policy/standard/sms.h"
-#include "policy/standard/wifi.h"
 
-#include <gtest/gtest.h>
-
-static void net_types(std::initializer_list<const char *> texts)
+DEVICE_TEST(network, ClassOfEachName)
 {
-    for (const char *text : texts) {
-        nv("network_type", text), notify(23, 0x40);
-        fake_note(text + std::string(" is ") + std::to_string(led_net_type));
+    const auto class_of = [](const char *name) {
+        nv("network_type", name);
         led_net_type = 0;
+        notify(KIV_MODULE_NWINFO, REG_NWINFO_NETTYPE);
+        return int{led_net_type};
+    };
+    switched_on(LED_PRODUCT_PAPER_KITE);
+    for (const char *name : {"GSM", "GPRS", "EDGE", "CDMA"}) {
+        EXPECT_EQ(class_of(name), 2) << name;
+    }
+    for (const char *name :
+         {"HSDPA", "HSUPA", "UMTS", "HSPA", "HSPA+", "DC-HSPA+", "EVDO", "EVDO_EHRPD", "CDMA_EVDO", "TDSCDMA"}) {
+        EXPECT_EQ(class_of(name), 3) << name;
+    }
+    EXPECT_EQ(class_of("LTE"), 4);
+    for (const char *name : {"SA", "LTE-NSA", "ENDC"}) {
+        EXPECT_EQ(class_of(name), 5) << name;
+    }
+    for (const char *name : {"", "lte", "LTE ", "LT", "LIMITED_SERVICE_GSM", "NO_SERVICE"}) {
+        EXPECT_EQ(class_of(name), 1) << name;
     }
 }
 
-static void bars(std::initializer_list<const char *> counts)
+DEVICE_TEST(network, ClassesOnTheNetLed)
 {
-    for (const char *count : counts) {
-        nv("signalbar", count), notify(23, 1);
+    switched_on(LED_PRODUCT_UFI);
+    for (const char *name : {"GSM", "UMTS", "LTE", "SA", "none", ""}) { // the last two are one class
+        nv("network_type", name);
+        notify(KIV_MODULE_NWINFO, REG_NWINFO_NETTYPE);
     }
+    expect_effects(R"(
+        only net_blue on 2
+        only net_blue on 2
+        only net_blue on 2
+        only net_white on 2
+        only net_red on 2)");
+
+    notify(KIV_MODULE_NWINFO, REG_NWINFO_NETTYPE);
+    expect_log("kiv_mirta_led", R"(
+        info "recv  REG_NWINFO_NETTYPE \n"
+        error "recv nettype \n"
+        info "enter kiv_led_handle_nwinfoStatus : 1\n "
+        info "kiv_set_net_led_state :state same!\n")");
 }
 
-static void wifi_and_wps(const char *wifi, const char *chip1, const char *chip2)
+// A text that does not fit is cut; the handheld shows no roaming and no bars.
+DEVICE_TEST(network, RoamingAndBarsOfTheHandheld)
 {
-    nv("wifi_onoff_state", wifi), nv("wifi_chip1_wps_state", chip1), nv("wifi_chip2_wps_state", chip2);
-    kiv_led_set_wifi_wps_state();
+    switched_on(LED_PRODUCT_UFI);
+    nv("simcard_roam", std::string(500, 'r'));
+    nv("signalbar", "3");
+    notify(KIV_MODULE_NWINFO, REG_NWINFO_ROAMING_STATUS);
+    notify(KIV_MODULE_NWINFO, REG_NWINFO_SIG_BAR);
+    expect_effects("");
+    expect_log("kiv_mirta_led", R"(
+        info "recv  REG_NWINFO_ROAMING_STATUS \n"
+        error "recv roam state:r{63}...\n"
+        info "recv  REG_NWINFO_SIG_BAR \n"
+        info "recv_nwSigStatus :3")");
 }
 
-static void note_sms()
+// Neither power nor sleep is looked at.
+DEVICE_TEST(signal_led, DataCard)
 {
-    fake_note("sms " + std::to_string(led_sms_state));
+    switched_on(LED_PRODUCT_DATA_CARD);
+    led_power_state = POWER_OFF;
+    cur_led_sleep_status = 1;
+    for (const char *bars : {"", "1", "2", "2", "5", "7", "5", "-1", "0", "99999999999", "3", "4"}) {
+        nv("signalbar", bars);
+        notify(KIV_MODULE_NWINFO, REG_NWINFO_SIG_BAR);
+    }
+    expect_effects(R"(
+        sig_6 blink 200/1400 4
+        sig_6 on 4
+        sig_6 on 4
+        sig_6 on 4
+        sig_6 off
+        sig_6 on 4
+        sig_6 on 4)");
+
+    nv("signalbar", "1");
+    notify(KIV_MODULE_NWINFO, REG_NWINFO_SIG_BAR);
+    expect_log("kiv_mirta_led", R"(
+        info "recv  REG_NWINFO_SIG_BAR \n"
+        info "recv_nwSigStatus :1"
+        info "kiv_led_handle_signal_state :1"
+        info "kiv_set_signal_led_state :6")");
 }
 
-// Calls and what they cause stand side by side.
-// clang-format off
-TEST(network, TypeShowsOnTheNetLed)
+DEVICE_TEST(signal_led, SingleChip)
 {
-    expect_effects("classes by exact text", R"(
-        net off | led 15 on 2 | GSM is 2 | net off | led 15 on 2 | CDMA is 2 | net off | led 15 on 2 | HSPA+ is 3
-        net off | led 15 on 2 | CDMA_EVDO is 3 | net off | led 15 on 2 | LTE is 4 | net off | led 17 on 2 | SA is 5
-        net off | led 17 on 2 | LTE-NSA is 5 | net off | led 17 on 2 | ENDC is 5 | net off | led 13 on 2 | lte is 1
-        net off | led 13 on 2 | LIMITED_SERVICE_GSM is 1 | net off | led 13 on 2 | is 1)",
-        [] { product_on(LED_PRODUCT_PAPER_KITE);
-             net_types({"GSM", "CDMA", "HSPA+", "CDMA_EVDO", "LTE", "SA", "LTE-NSA", "ENDC", "lte",
-                        "LIMITED_SERVICE_GSM", ""}); });
-    expect_effects("the same class again, off, asleep", "net off | led 15 on 2 | net off",
-        [] { product_on(LED_PRODUCT_UFI); nv("network_type", "UMTS"); notify(23, 0x40); notify(23, 0x40);
-             nv("network_type", "SA"); led_power_state = POWER_OFF; notify(23, 0x40); led_power_state = POWER_ON;
-             cur_led_sleep_status = 1; notify(23, 0x40); });
-    expect_calls("a text that does not fit is cut", R"(
-        recv 0 1036 | 6 "[info] enter messageParse fun\n" | 6 "recv_msg.us_source_module_id is 23"
-        6 "recv_msg.us_cmd is 12034" | 6 "[info] msg MSG_CMD_SERVICE_NOTIFY \n"
-        6 "regDecodeMsg source_id 23, mask1 2" | 6 "[info] source msg KIV_MODULE_NWINFO\n"
-        6 "recv  REG_NWINFO_ROAMING_STATUS \n" | nv simcard_roam 64 | 0 "recv roam state:r{63}...\n")",
-        [] { product_on(LED_PRODUCT_UFI); nv("simcard_roam", std::string(500, 'r').c_str()); notify(23, 2); });
+    const auto bars = [](const char *text) {
+        nv("signalbar", text);
+        notify(KIV_MODULE_NWINFO, REG_NWINFO_SIG_BAR);
+    };
+    switched_on(LED_PRODUCT_UNI_CORE_CPE);
+    for (const char *text : {"0", "3", "4", "1", "-1"}) {
+        bars(text);
+    }
+    expect_effects(R"(
+        sig_blue on 3
+        sig_blue on 1
+        sig_blue on 3)");
+    bars("2");
+    expect_log("kiv_mirta_led", R"(
+        info "recv  REG_NWINFO_SIG_BAR \n"
+        info "recv_nwSigStatus :2"
+        info "kiv_led_handle_signal_state :2"
+        info "kiv_qt330x_set_led_signal_state: sig = 2")");
+
+    over_temp_enable = 1;
+    is_over_temp = 1;
+    bars("1"); // for later
+    expect_effects("");
+    expect_log("kiv_mirta_led", R"(
+        info "recv  REG_NWINFO_SIG_BAR \n"
+        info "recv_nwSigStatus :1"
+        error "kiv_cpe_led_handle_signal_state, OVER TEMP!")");
+    EXPECT_EQ(int{led_signal_level}, 1);
+
+    cur_led_sleep_status = 5;
+    bars("2");
+    expect_log("kiv_mirta_led", R"(
+        info "recv  REG_NWINFO_SIG_BAR \n"
+        info "recv_nwSigStatus :2"
+        error "kiv_singlechip_led_handle_signal_state, sleep mode!")");
+    led_power_state = POWER_RESETTING;
+    bars("2");
+    expect_log("kiv_mirta_led", R"(
+        info "recv  REG_NWINFO_SIG_BAR \n"
+        info "recv_nwSigStatus :2"
+        error "kiv_singlechip_led_handle_signal_state, not power on!")");
+    EXPECT_EQ(int{led_signal_level}, 1);
 }
 
-TEST(network, SignalBars)
+DEVICE_TEST(wifi, StatusAndPairing)
 {
-    expect_effects("data card, asleep and off too", R"(
-        led 6 blink 200/1400 4 | led 6 on 4 | led 6 on 4 | led 6 on 4 | led 6 off | led 6 on 4)",
-        [] { product_on(LED_PRODUCT_DATA_CARD); led_power_state = POWER_OFF; cur_led_sleep_status = 1;
-             bars({"", "1", "2", "2", "5", "7", "5", "-1", "0", "99999999999", "3"}); });
-    expect_effects("single chip", "led 8 on 3 | led 8 on 1 | led 8 on 3",
-        [] { product_on(LED_PRODUCT_UNI_CORE_CPE); bars({"0", "3", "4", "1", "-1"}); led_power_state = POWER_RESETTING;
-             bars({"2"}); led_power_state = POWER_ON; cur_led_sleep_status = 5; bars({"2"}); });
-    expect_effects("single chip, too hot: stored for later", "level 2",
-        [] { product_on(LED_PRODUCT_UNI_CORE_CPE); over_temp_enable = 1; is_over_temp = 1; bars({"2"});
-             fake_note("level " + std::to_string(led_signal_level)); });
-    expect_errors("single chip's lines", R"(
-        0 "kiv_singlechip_led_handle_signal_state, not power on!"
-        0 "kiv_singlechip_led_handle_signal_state, sleep mode!" | 0 "kiv_cpe_led_handle_signal_state, OVER TEMP!")",
-        [] { kiv_singlechip_led_handle_signal_state(1); led_power_state = POWER_ON; cur_led_sleep_status = 1;
-             kiv_singlechip_led_handle_signal_state(1); cur_led_sleep_status = 0; over_temp_enable = 1;
-             is_over_temp = 1; kiv_singlechip_led_handle_signal_state(1); });
+    switched_on(LED_PRODUCT_UFI);
+    notify(KIV_MODULE_WLAN, REG_WLAN_CURRENT_STATUS, "1");
+    notify(KIV_MODULE_WLAN, REG_WLAN_CURRENT_STATUS, "2");
+    notify(KIV_MODULE_WLAN, REG_WLAN_CURRENT_STATUS, "0");
+    notify(KIV_MODULE_WLAN, REG_WLAN_AP_WPS_STATE, "1");
+    notify(KIV_MODULE_WLAN, REG_WLAN_AP_WPS_STATE_CHIP2, "0");
+    expect_effects(R"(
+        wifi_blue on 2
+        wifi_blue off
+        wifi_blue blink 400/1600 2
+        wifi_blue on 2)");
+    expect_log("kiv_mirta_led", R"(
+        info " recv REG_WLAN_CURRENT_STATUS wifi status= p_data=1\n"
+        info "enter kiv_led_set_led_wifi_status wifi_status=1, cur_led_sleep_status=0\n"
+        info "wifi blue on\n"
+        info " recv REG_WLAN_CURRENT_STATUS wifi status= p_data=2\n"
+        info "enter kiv_led_set_led_wifi_status wifi_status=2, cur_led_sleep_status=0\n"
+        info " recv REG_WLAN_CURRENT_STATUS wifi status= p_data=0\n"
+        info "enter kiv_led_set_led_wifi_status wifi_status=0, cur_led_sleep_status=0\n"
+        info "wifi led off\n"
+        info "recv REG_WLAN_AP_WPS_STATE p_data=1\n"
+        info "enter kiv_led_set_led_wps_status wps_status=1, cur_led_sleep_status=0\n"
+        info "WPS active, wifi blue blink 2 mins\n"
+        info "recv REG_WLAN_AP_WPS_STATE p_data=0\n"
+        info "enter kiv_led_set_led_wps_status wps_status=0, cur_led_sleep_status=0\n"
+        info "WPS disactive,wifi blue on\n")");
 }
 
-TEST(wifi, StatusAndPairing)
+TEST(wifi, WhichProductsShowIt)
 {
-    expect_effects("notifications", R"(led 43 on 2 | led 43 off | led 43 blink 400/1600 2 | led 43 on 2)",
-        [] { product_on(LED_PRODUCT_UFI); notify(10, 0x10, "1"); notify(10, 0x10, "2"); notify(10, 0x10, "0");
-             notify(10, 0x80, "1"); notify(10, 0x100, "0"); led_product_type = LED_PRODUCT_MODULE;
-             notify(10, 0x10, "1"); });
-    expect_logs("relight, wake-up and their lines", R"(
-        6 "WIFI status: 1  WPS status: ,1\n" | 6 "WPS active, wifi blue blink 2 mins\n"
-        6_operation "enter kiv_led_set_wifi_led_operation led_id=43,led_operation=2\n"
-        6 "WIFI status: 0  WPS status: 1,\n" | 6 "wifi_wps_state: wifi led off\n" | 6 "wifi led off\n"
-        6_operation "kiv_led_set_wifi_led_off" | 6 "WIFI status: 1  WPS status: 2,0\n"
-        6 "WPS disactive,wifi blue on\n"
-        6_operation "enter kiv_led_set_wifi_led_operation led_id=43,led_operation=0\n"
-        6 "WIFI status: 3  WPS status: 1,1\n" | 6 "WIFI status: 1  WPS status: ,\n"
-        6 "wifi_wps_state: sleep so wifi led off\n" | 6 "wifi led off\n" | 6_operation "kiv_led_set_wifi_led_off"
-        6 "enter kiv_led_set_led_wakeup_wlan\n" | 6 "WIFI status: 1\n" | 6 "WPS status: 0\n"
-        6 "enter kiv_led_set_led_wifi_status wifi_status=1, cur_led_sleep_status=2\n" | 6 "wifi led off\n"
-        6_operation "kiv_led_set_wifi_led_off" | 6 "enter kiv_led_set_led_wakeup_wlan\n"
-        6 "enter kiv_led_set_led_wakeup_wlan, not power on \n " | 6 "enter kiv_led_set_led_wifi_init\n"
-        6 "enter kiv_led_set_led_wifi_init, not power on \n "
-        6 "enter kiv_led_set_wifi_wps_state, not power on \n ")",
-        [] { product_on(LED_PRODUCT_UFI); wifi_and_wps("1", "", "1"); wifi_and_wps("0", "1", "");
-             wifi_and_wps("1", "2", "0"); wifi_and_wps("3", "1", "1"); cur_led_sleep_status = 2;
-             wifi_and_wps("1", "", ""); nv("RadioOff", "1"); nv("WscModeOption", "0"); kiv_led_set_led_wakeup_wlan();
-             led_power_state = POWER_OFF; kiv_led_set_led_wakeup_wlan(); kiv_led_set_led_wifi_init();
-             kiv_led_set_wifi_wps_state(); });
+    const auto shows = [](led_product product, const std::string &status, const std::string &pairing) {
+        on_a_fresh_device("product " + std::to_string(product), [product, status, pairing] {
+            switched_on(product);
+            notify(KIV_MODULE_WLAN, REG_WLAN_CURRENT_STATUS, "1");
+            expect_effects(status);
+            notify(KIV_MODULE_WLAN, REG_WLAN_AP_WPS_STATE, "1");
+            expect_effects(pairing);
+        });
+    };
+    shows(LED_PRODUCT_UFI, "wifi_blue on 2", "wifi_blue blink 400/1600 2");
+    shows(LED_PRODUCT_DATA_CARD, "", "");
+    shows(LED_PRODUCT_PAPER_KITE, "wifi_blue on 2", "wifi_blue blink 400/1600 2");
+    shows(LED_PRODUCT_MODULE, "", "");
+    shows(LED_PRODUCT_UNI_CORE_CPE, "wifi_blue on 2", "wifi_blue blink 400/1600 2");
 }
 
-TEST(sms, NewMessageBlinksForTenSeconds)
+// A relight reads Wi-Fi and both chips' pairing from NV.
+DEVICE_TEST(wifi, Relit)
 {
-    expect_effects("new, another, timer, unread, none", R"(
-        sms off | led 50 blink 800/1200 4 | timer 10000 once "" = 1 | delete 1 | timer 10000 once "" = 2 | sms off
-        led 50 on 4 | sms 1 | sms off | led 50 off | sms 0)",
-        [] { product_on(LED_PRODUCT_UFI); notify(5, 4); notify(5, 4); notify(5, 2); fake_fire(2); note_sms();
-             nv("sms_nvunread_count", "0"); notify(5, 2); note_sms(); });
-    expect_effects("read while it blinks; a fired timer's handle is deleted", R"(
-        sms off | led 50 blink 800/1200 4 | timer 10000 once "" = 1 | delete 1 | sms off | led 50 off | sms off
-        led 50 blink 800/1200 4 | timer 10000 once "" = 2 | sms off | led 50 on 4 | sms off | led 50 blink 800/1200 4
-        timer 10000 once "" = 3 | delete 3 | sms off | led 50 blink 800/1200 4 | sms 3)",
-        [] { product_on(LED_PRODUCT_UFI); nv("sms_nvunread_count", "0"); notify(5, 4); notify(5, 2); notify(5, 4);
-             fake_fire(2); notify(5, 4); notify(5, 0x1000); note_sms(); });
-    expect_effects("no timer to be had", R"(
-        sms off | led 50 blink 800/1200 4 | timer 10000 once "" = 0 | timer 10000 once "" = 1 | delete 1 | sms off
-        led 50 off)",
-        [] { product_on(LED_PRODUCT_UFI); fake_platform().failing_timers = 1; notify(5, 4); notify(5, 4);
-             nv("sms_nvunread_count", "0"); notify(5, 2); });
+    const auto relit = [](const char *status, const char *chip1, const char *chip2, const std::string &lines,
+                          const std::string &led) {
+        nv("wifi_onoff_state", status);
+        nv("wifi_chip1_wps_state", chip1);
+        nv("wifi_chip2_wps_state", chip2);
+        command(KIV_MSG_CMD_LED_RELIGHT_MSG);
+        expect_log("kiv_mirta_led", R"(
+            error "Enter kiv_led_handle_relight_msg"
+            error "kiv_cpe_led_relight_signal_state, NOT OVER TEMP!"
+            info "kiv_qt330x_set_led_signal_state: sig = 0")" +
+                                        lines + R"(
+            info "enter kiv_set_net_led_state type=0 , ppp=0\n"
+            error "Exit kiv_led_handle_relight_msg")");
+        expect_effects("sig_blue on 0\npower_blue on 2\n" + led);
+    };
+    switched_on(LED_PRODUCT_UFI);
+    relit("1", "", "1", R"(
+        info "WIFI status: 1  WPS status: ,1\n"
+        info "WPS active, wifi blue blink 2 mins\n")",
+          "wifi_blue blink 400/1600 2");
+    relit("0", "1", "", R"(
+        info "WIFI status: 0  WPS status: 1,\n"
+        info "wifi_wps_state: wifi led off\n"
+        info "wifi led off\n")",
+          "wifi_blue off");
+    relit("1", "2", "0", R"(
+        info "WIFI status: 1  WPS status: 2,0\n"
+        info "WPS disactive,wifi blue on\n")",
+          "wifi_blue on 2");
+    relit("3", "1", "1", R"(
+        info "WIFI status: 3  WPS status: 1,1\n")",
+          "");
+    cur_led_sleep_status = 2;
+    relit("1", "1", "", R"(
+        info "WIFI status: 1  WPS status: 1,\n"
+        info "wifi_wps_state: sleep so wifi led off\n"
+        info "wifi led off\n")",
+          "wifi_blue off");
 }
 
-TEST(sms, StoreFullAndGuards)
+DEVICE_TEST(sms, NewMessageBlinksForTenSeconds)
 {
-    expect_effects("full until there is room", R"(
-        sms off | led 50 blink 800/1200 4 | sms 3 | sms 3 | sms off | led 50 on 4 | sms 1)",
-        [] { product_on(LED_PRODUCT_UFI); notify(5, 0x1000); notify(5, 2); note_sms(); nv("sms_nv_capability", "100");
-             nv("sms_nvtotal_count", "100"); notify(5, 4); note_sms(); nv("sms_nvtotal_count", "99"); notify(5, 2);
-             note_sms(); });
-    expect_effects("off and asleep only record", R"(
-        sms 3 | sms 2 | bat off | net off | led 13 on 2 | led 43 off | sms off | led 50 blink 800/1200 4
-        timer 10000 once "" = 1)",
-        [] { product_on(LED_PRODUCT_UFI); led_power_state = POWER_OFF; notify(5, 0x1000); note_sms();
-             led_power_state = POWER_ON; cur_led_sleep_status = 1; notify(5, 4); note_sms(); led_net_type = 1;
-             notify(27, 1, "0"); });
-    expect_effects("a quick power-off leaves the timer", "sms off | led 50 on 4",
-        [] { product_on(LED_PRODUCT_UFI); notify(5, 4); mc(0x40000200); forget(); fake_fire(1); });
+    switched_on(LED_PRODUCT_UFI);
+    notify(KIV_MODULE_SMS, REG_WMS_SMS_NEW_SMS);
+    expect_effects(R"(
+        only sms_blue blink 800/1200 4
+        timer 10000 once)");
+    expect_log("kiv_mirta_led", R"(
+        info "recv_SMSstatus"
+        info "recv recv_SMSstatus status from 0 to 2 \n"
+        info "kiv_led_handle_sms_state:sms_state=: 2 \n "
+        info "enter kiv_led_set_new_sms_timer")");
+    notify(KIV_MODULE_SMS, REG_WMS_SMS_NEW_SMS); // ten seconds from now
+    expect_effects(R"(
+        deleted timer 10000
+        timer 10000 once)");
+    expect_log("kiv_mirta_led", R"(
+        info "recv_SMSstatus"
+        info "recv recv_SMSstatus status from 2 to 2 \n"
+        info "enter kiv_led_del_new_sms_timer"
+        info "enter kiv_led_set_new_sms_timer")");
+    notify(KIV_MODULE_SMS, REG_WMS_SMS_NV_UNREAD_SMS); // the blink goes on
+    expect_effects("");
+    expect_log("kiv_mirta_led", R"(
+        info "recv_SMSstatus"
+        info "recv REG_WMS_SMS_NV_UNREAD_SMS p_data=\n"
+        info "recv recv_SMSstatus status from 2 to 1 \n"
+        info "kiv_led_handle_sms_state:sms_state=: 1 \n ")");
+    fire_timers(10000);
+    expect_effects("only sms_blue on 4");
+    expect_log("kiv_mirta_led", R"(
+        info "enter kiv_led_new_sms_timeout_proc")");
+    EXPECT_EQ(int{led_sms_state}, SMS_UNREAD);
+    nv("sms_nvunread_count", "0");
+    notify(KIV_MODULE_SMS, REG_WMS_SMS_NV_UNREAD_SMS);
+    expect_effects("only sms_blue off");
+    EXPECT_EQ(int{led_sms_state}, SMS_NONE);
 }
 
-TEST(voice, RoutedByProduct)
+DEVICE_TEST(sms, ReadWhileItBlinks)
 {
-    expect_effects("single chip, asleep and off too",
-        "voice off | led 60 blink 400/1600 4 | voice off | led 60 on 4 | voice off | led 60 off",
-        [] { product_on(LED_PRODUCT_UNI_CORE_CPE); cur_led_sleep_status = 1; notify(43, 2, "PHONE BLINK");
-             notify(43, 2, "PHONE BLINK"); led_power_state = POWER_OFF; notify(43, 2, "PHONE LED ON");
-             notify(43, 2, "phone led on"); notify(43, 2, "PHONE LED ON" + std::string(1008, '!')); });
-    expect_effects("module, voicemail there alone",
-        "voice off | led 60 blink 1000/1000 4 | voicemail off | led 63 blink 1000/1000 1",
-        [] { product_on(LED_PRODUCT_MODULE);
-             mc(0x40); forget(); notify(43, 2, "PHONE BLINK"); notify(5, 0x2000, "1");
-             led_product_type = LED_PRODUCT_UFI; notify(5, 0x2000, "1"); notify(43, 2, "PHONE LED ON"); });
+    switched_on(LED_PRODUCT_UFI);
+    nv("sms_nvunread_count", "0");
+    notify(KIV_MODULE_SMS, REG_WMS_SMS_NEW_SMS);
+    notify(KIV_MODULE_SMS, REG_WMS_SMS_NV_UNREAD_SMS);
+    expect_effects(R"(
+        only sms_blue blink 800/1200 4
+        timer 10000 once
+        deleted timer 10000
+        only sms_blue off)");
 }
-// clang-format on
+
+DEVICE_TEST(sms, NoTimerToBeHad)
+{
+    switched_on(LED_PRODUCT_UFI);
+    fake_platform().failing_timers = 1;
+    notify(KIV_MODULE_SMS, REG_WMS_SMS_NEW_SMS);
+    notify(KIV_MODULE_SMS, REG_WMS_SMS_NEW_SMS);
+    expect_effects(R"(
+        only sms_blue blink 800/1200 4
+        timer 10000 once fails
+        timer 10000 once)");
+}
+
+// Full stays full until there is room, and ends the blink of a new message.
+DEVICE_TEST(sms, StoreFull)
+{
+    switched_on(LED_PRODUCT_UFI);
+    notify(KIV_MODULE_SMS, REG_WMS_SMS_NEW_SMS);
+    expect_effects(R"(
+        only sms_blue blink 800/1200 4
+        timer 10000 once)");
+    notify(KIV_MODULE_SMS, REG_WMS_SMS_MEMORY_FULL);
+    expect_effects(R"(
+        deleted timer 10000
+        only sms_blue blink 800/1200 4)");
+    expect_log("kiv_mirta_led", R"(
+        info "recv_SMSstatus"
+        info "recv recv_SMSstatus status from 2 to 3 \n"
+        info "kiv_led_handle_sms_state:sms_state=: 3 \n "
+        info "enter kiv_led_del_new_sms_timer")");
+    nv("sms_nv_capability", "100");
+    nv("sms_nvtotal_count", "100");
+    notify(KIV_MODULE_SMS, REG_WMS_SMS_NEW_SMS);
+    expect_effects("");
+    expect_log("kiv_mirta_led", R"(
+        info "recv_SMSstatus"
+        info "recv recv_SMSstatus status from 3 to 2 \n"
+        info "sms_nv_capability= 100 ,sms_nvtotal_count= 100 \n")");
+    EXPECT_EQ(int{led_sms_state}, SMS_STORE_FULL);
+    nv("sms_nvtotal_count", "99");
+    notify(KIV_MODULE_SMS, REG_WMS_SMS_NV_UNREAD_SMS);
+    expect_effects("only sms_blue on 4");
+}
+
+DEVICE_TEST(sms, OffAndAsleepItIsOnlyRemembered)
+{
+    switched_on(LED_PRODUCT_UFI);
+    led_power_state = POWER_OFF;
+    notify(KIV_MODULE_SMS, REG_WMS_SMS_MEMORY_FULL);
+    expect_effects("");
+    EXPECT_EQ(int{led_sms_state}, SMS_STORE_FULL);
+    led_power_state = POWER_ON;
+    cur_led_sleep_status = 1;
+    notify(KIV_MODULE_SMS, REG_WMS_SMS_NEW_SMS);
+    expect_effects("");
+    expect_log("kiv_mirta_led", R"(
+        info "recv_SMSstatus"
+        info "recv recv_SMSstatus status from 3 to 2 \n"
+        info "recv recv_SMSstatus : sleep mode \n")");
+    EXPECT_EQ(int{led_sms_state}, SMS_NEW);
+    notify(KIV_MODULE_SLEEP, REG_SLEEP_STATUS_EVENT, "0");
+    expect_effects(R"(
+        bat off
+        only net_red on 2
+        wifi_blue off
+        only sms_blue blink 800/1200 4
+        timer 10000 once)");
+}
+
+DEVICE_TEST(voice, PhoneOfTheSingleChip)
+{
+    switched_on(LED_PRODUCT_UNI_CORE_CPE);
+    cur_led_sleep_status = 1; // rings all the same
+    notify(KIV_MODULE_VOICE, REG_VOICE_PHONE_LED_STATE, "PHONE BLINK");
+    notify(KIV_MODULE_VOICE, REG_VOICE_PHONE_LED_STATE, "PHONE BLINK");
+    expect_effects("only voice_blue blink 400/1600 4");
+    expect_log("kiv_mirta_led", R"(
+        info "recv REG_VOICE_PHONE_LED_STATE p_data=PHONE BLINK\n"
+        info "recv_voicePhoneStatus, sleep mode \n "
+        info "set voice phone led from 0 to 2\n"
+        info "recv REG_VOICE_PHONE_LED_STATE p_data=PHONE BLINK\n"
+        info "recv_voicePhoneStatus, sleep mode \n ")");
+    led_power_state = POWER_OFF;
+    notify(KIV_MODULE_VOICE, REG_VOICE_PHONE_LED_STATE, "PHONE LED ON");
+    notify(KIV_MODULE_VOICE, REG_VOICE_PHONE_LED_STATE, "phone led on");
+    notify(KIV_MODULE_VOICE, REG_VOICE_PHONE_LED_STATE, "PHONE LED ON" + std::string(1008, '!'));
+    expect_effects(R"(
+        only voice_blue on 4
+        only voice_blue off)");
+    expect_log("kiv_mirta_led", R"(
+        info "recv REG_VOICE_PHONE_LED_STATE p_data=PHONE LED ON\n"
+        info "recv_voicePhoneStatus, not power on \n "
+        info "set voice phone led from 2 to 1\n"
+        info "recv REG_VOICE_PHONE_LED_STATE p_data=phone led on\n"
+        info "recv_voicePhoneStatus, not power on \n "
+        info "set voice phone led from 1 to 0\n"
+        info "recv REG_VOICE_PHONE_LED_STATE p_data=PHONE LED ON!{1008}\n"
+        info "recv_voicePhoneStatus, not power on \n ")");
+}
+
+TEST(voice, WhichProductsShowPhoneAndVoicemail)
+{
+    const auto shows = [](led_product product, const std::string &phone, const std::string &voicemail) {
+        on_a_fresh_device("product " + std::to_string(product), [product, phone, voicemail] {
+            switched_on(product);
+            if (product == LED_PRODUCT_MODULE) {
+                notify(KIV_MODULE_MAIN, REG_MC_EVENT_POWERON);
+            }
+            forget();
+            notify(KIV_MODULE_VOICE, REG_VOICE_PHONE_LED_STATE, "PHONE BLINK");
+            expect_effects(phone);
+            notify(KIV_MODULE_SMS, REG_WMS_SMS_VOCEMAIL_SET_FLAG, "1");
+            expect_effects(voicemail);
+        });
+    };
+    shows(LED_PRODUCT_UFI, "", "");
+    shows(LED_PRODUCT_DATA_CARD, "", "");
+    shows(LED_PRODUCT_PAPER_KITE, "", "");
+    shows(LED_PRODUCT_MODULE, "only voice_blue blink 1000/1000 4", "only voicemail_green blink 1000/1000 1");
+    shows(LED_PRODUCT_UNI_CORE_CPE, "only voice_blue blink 400/1600 4", "");
+}

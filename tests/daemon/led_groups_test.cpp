@@ -1,15 +1,7 @@
 #include "output/led_groups.h"
 
 #include "harness.h"
-
-#include <gtest/gtest.h>
-
-static void fail_all()
-{
-    for (int id = 0; id <= LED_SIGBAR_15; ++id) {
-        fake_platform().led_results[id] = -5;
-    }
-}
+#include "kiv/adabsp.h"
 
 static void night(int close_all)
 {
@@ -19,126 +11,234 @@ static void night(int close_all)
 
 static void operate_each_group()
 {
-    kiv_led_set_sig_led_operation(6, 0, 0, 0, 4);
-    kiv_led_set_net_led_operation(17, 0, 0, 0, 2);
-    kiv_led_set_rssi_led_operation(45, 2, 1, 2, 3);
-    kiv_led_set_power_led_operation(52, 0, 0, 0, 2);
-    kiv_led_set_power_led_operation(54, 0, 0, 0, 1);
-    kiv_led_set_bat_led_operation(1, 2, 800, 1200, 4);
-    kiv_led_set_wifi_led_operation(43, 0, 0, 0, 2);
-    kiv_led_set_sms_led_operation(50, 0, 0, 0, 4);
-    kiv_led_set_flow_led_operation(10, 0, 0, 0, 1);
-    kiv_led_set_voicemail_led_operation(63, 2, 1000, 1000, 1);
-    kiv_led_set_voicemail_led_operation(63, 1, 0, 0, 0);
-    kiv_led_set_voicemail_led_operation(65, 0, 0, 0, 1);
-    kiv_led_set_voicemail_led_operation(61, 0, 0, 0, 1);
-    kiv_led_set_voicemail_led_operation(66, 1, 0, 0, 0);
-    kiv_led_set_voice_led_operation(60, 0, 0, 0, 4);
-    kiv_led_set_sigbar_led_operation(70, 0, 0, 0, 1);
-    kiv_led_set_led_operation(41, 0, 0, 0, 4);
+    kiv_led_set_sig_led_operation(LED_SIG_6, LED_OP_ON, 0, 0, 4);
+    kiv_led_set_net_led_operation(LED_NET_WHITE, LED_OP_BLINK, 400, 600, 2);
+    kiv_led_set_rssi_led_operation(LED_RSSI_GREEN, LED_OP_BLINK, 1, 2, 3);
+    kiv_led_set_power_led_operation(LED_POWER_BLUE, LED_OP_ON, 0, 0, 2);
+    kiv_led_set_bat_led_operation(LED_BAT_GREEN, LED_OP_BLINK, 800, 1200, 4);
+    kiv_led_set_wifi_led_operation(LED_WIFI_BLUE, LED_OP_BLINK, 400, 1600, 2);
+    kiv_led_set_sms_led_operation(LED_SMS_BLUE, LED_OP_ON, 0, 0, 4);
+    kiv_led_set_flow_led_operation(LED_FLOW_GREEN, LED_OP_ON, 0, 0, 1);
+    kiv_led_set_voicemail_led_operation(LED_VOICEMAIL_GREEN, LED_OP_BLINK, 1000, 1000, 1);
+    kiv_led_set_voicemail_led_operation(LED_VOICEMAIL_GREEN, LED_OP_OFF, 0, 0, 0);
+    kiv_led_set_voice_led_operation(LED_VOICE_BLUE, LED_OP_ON, 0, 0, 4);
+    kiv_led_set_sigbar_led_operation(LED_SIGBAR_0 + 4, LED_OP_ON, 0, 0, 1);
+    kiv_led_set_led_operation(LED_NET_RED, LED_OP_ON, 0, 0, 4);
+}
+
+static void operate_what_is_refused()
+{
+    kiv_led_set_power_led_operation(LED_POWER_54, LED_OP_ON, 0, 0, 1);
+    kiv_led_set_voicemail_led_operation(LED_VOICEMAIL_RED - 1, LED_OP_ON, 0, 0, 1);
+    kiv_led_set_voicemail_led_operation(LED_VOICEMAIL_YELLOW + 1, LED_OP_OFF, 0, 0, 0);
 }
 
 static void switch_each_group_off()
 {
     kiv_led_set_sig_led_off();
+    kiv_led_set_net_led_off();
+    kiv_led_set_rssi_led_off();
     kiv_led_set_power_led_off();
+    kiv_led_set_bat_led_off();
     kiv_led_set_wifi_led_off();
+    kiv_led_set_sms_led_off();
+    kiv_led_set_flow_led_off();
+    kiv_led_set_voicemail_led_off();
+    kiv_led_set_voice_led_off();
+    kiv_led_set_sigbar_led_off();
 }
 
-// Calls and what they cause stand side by side.
-// clang-format off
-TEST(led_groups, OperationsInOrder)
+DEVICE_TEST(led_groups, ByDayRequestsPassUnchanged)
 {
-    expect_effects("requests", R"(
-        led 6 on 4 | net off | led 17 on 2 | led 44 off | led 45 off | led 46 off | led 47 off | led 45 blink 1/2 3
-        led 52 on 2 | bat off | led 1 blink 800/1200 4 | led 43 on 2 | sms off | led 50 on 4 | led 9 off | led 12 off
-        led 10 off | led 11 off | led 10 on 1 | voicemail off | led 63 blink 1000/1000 1 | led 63 off
-        voicemail off | led 65 on 1 | voice off
-        led 60 on 4 | led 66 off | led 67 off | led 68 off | led 69 off | led 70 off | led 71 off | led 72 off
-        led 73 off | led 74 off | led 75 off | led 76 off | led 77 off | led 78 off | led 79 off | led 80 off
-        led 81 off | led 70 on 1 | led 41 on 4)", operate_each_group);
-    expect_logs("lines, off before or after the entry", R"(
-        6_operation "enter kiv_led_set_sig_led_operation led_id=6,led_operation=0\n"
-        6_operation "enter kiv_led_set_net_led_operation led_id=17,led_operation=0\n"
-        6_operation "enter kiv_led_set_net_led_off\n"
-        6_operation "kiv_led_set_rssi_led_operation led_id=45,led_operation=2\n"
-        6_operation "kiv_led_set_rssi_led_off"
-        6_operation "enter kiv_led_set_power_led_operation led_id=52,led_operation=0\n"
-        6_operation "enter kiv_led_set_power_led_operation led_id=54,led_operation=0\n"
-        0_operation "led id error!\n" | 6_operation "enter kiv_led_set_bat_led_operation led_id=1,led_operation=2\n"
-        6_operation "kiv_led_set_bat_led_off"
-        6_operation "enter kiv_led_set_wifi_led_operation led_id=43,led_operation=0\n"
-        6_operation "kiv_led_set_sms_led_off"
-        6_operation "enter kiv_led_set_sms_led_operation led_id=50,led_operation=0\n"
-        6_operation "kiv_led_set_flow_led_off"
-        6_operation "enter kiv_led_set_flow_led_operation led_id=10,led_operation=0\n"
-        6_operation "kiv_led_set_voicemail_led_off"
-        6_operation "kiv_led_set_voicemail_led_operation led_id=63,led_operation=2\n"
-        6_operation "kiv_led_set_voicemail_led_off"
-        6_operation "kiv_led_set_voicemail_led_operation led_id=65,led_operation=0\n"
-        0_operation "kiv_led_set_voicemail_led_operation led_id error\n"
-        0_operation "kiv_led_set_voicemail_led_operation led_id error\n" | 6_operation "kiv_led_set_voice_led_off"
-        6_operation "kiv_led_set_voice_led_operation led_id=60,led_operation=0\n"
-        6_operation "kiv_led_set_sigbar_led_off"
-        6_operation "kiv_led_set_sigbar_led_operation led_id = 70 , led_operation=0\n")", operate_each_group);
-    expect_calls("off functions", R"(
-        6_operation "enter kiv_led_set_sig_led_off\n" | led 8 off | 6_operation "enter kiv_led_set_power_led_off\n"
-        led 52 off | 6_operation "kiv_led_set_wifi_led_off" | led 43 off)", switch_each_group_off);
+    step(operate_each_group);
+    expect_effects(R"(
+        sig_6 on 4
+        only net_white blink 400/600 2
+        only rssi_green blink 1/2 3
+        power_blue on 2
+        only bat_green blink 800/1200 4
+        wifi_blue blink 400/1600 2
+        only sms_blue on 4
+        only flow_green on 1
+        only voicemail_green blink 1000/1000 1
+        voicemail_green off
+        only voice_blue on 4
+        sigbar off
+        sigbar_4 on 1
+        net_red on 4)");
+}
+
+// The gate comes first and the entry line shows what it has made of the request. Some groups are switched off before
+// their entry line, some after it. Only net, sig, power and wifi pass the gate.
+DEVICE_TEST(led_groups, ByNightEveryStepOfEachGroup)
+{
+    night(0);
+    step(operate_each_group);
+    expect_trace(R"(
+        info kiv_mirta_led_operation "Night mode check: led_id=6 brightness=0"
+        info kiv_mirta_led_operation "enter kiv_led_set_sig_led_operation led_id=6,led_operation=1\n"
+        sig_6 off
+        info kiv_mirta_led_operation "Night mode check: led_id=17 brightness=1"
+        info kiv_mirta_led_operation "enter kiv_led_set_net_led_operation led_id=17,led_operation=2\n"
+        info kiv_mirta_led_operation "enter kiv_led_set_net_led_off\n"
+        only net_white blink 400/600 1
+        info kiv_mirta_led_operation "kiv_led_set_rssi_led_operation led_id=45,led_operation=2\n"
+        info kiv_mirta_led_operation "kiv_led_set_rssi_led_off"
+        only rssi_green blink 1/2 3
+        info kiv_mirta_led_operation "Night mode check: led_id=52 brightness=0"
+        info kiv_mirta_led_operation "enter kiv_led_set_power_led_operation led_id=52,led_operation=1\n"
+        power_blue off
+        info kiv_mirta_led_operation "enter kiv_led_set_bat_led_operation led_id=1,led_operation=2\n"
+        info kiv_mirta_led_operation "kiv_led_set_bat_led_off"
+        only bat_green blink 800/1200 4
+        info kiv_mirta_led_operation "Night mode check: led_id=43 brightness=0"
+        info kiv_mirta_led_operation "enter kiv_led_set_wifi_led_operation led_id=43,led_operation=1\n"
+        wifi_blue off 400/1600
+        info kiv_mirta_led_operation "kiv_led_set_sms_led_off"
+        sms off
+        info kiv_mirta_led_operation "enter kiv_led_set_sms_led_operation led_id=50,led_operation=0\n"
+        sms_blue on 4
+        info kiv_mirta_led_operation "kiv_led_set_flow_led_off"
+        flow off
+        info kiv_mirta_led_operation "enter kiv_led_set_flow_led_operation led_id=10,led_operation=0\n"
+        flow_green on 1
+        info kiv_mirta_led_operation "kiv_led_set_voicemail_led_off"
+        voicemail off
+        info kiv_mirta_led_operation "kiv_led_set_voicemail_led_operation led_id=63,led_operation=2\n"
+        voicemail_green blink 1000/1000 1
+        voicemail_green off
+        info kiv_mirta_led_operation "kiv_led_set_voice_led_off"
+        voice off
+        info kiv_mirta_led_operation "kiv_led_set_voice_led_operation led_id=60,led_operation=0\n"
+        voice_blue on 4
+        info kiv_mirta_led_operation "kiv_led_set_sigbar_led_off"
+        sigbar off
+        info kiv_mirta_led_operation "kiv_led_set_sigbar_led_operation led_id = 70 , led_operation=0\n"
+        sigbar_4 on 1
+        net_red on 4)");
+}
+
+DEVICE_TEST(led_groups, WhatTheGateLeavesLit)
+{
+    night(0);
+    step([] {
+        kiv_led_set_net_led_operation(LED_NET_RED, LED_OP_ON, 0, 0, 2);
+        kiv_led_set_net_led_operation(LED_NET_14, LED_OP_BLINK, 1000, 1000, 1);
+        kiv_led_set_net_led_operation(LED_NET_BLUE, LED_OP_ON, 0, 0, 2);
+        kiv_led_set_sig_led_operation(LED_SIG_BLUE, LED_OP_ON, 0, 0, 3);
+    });
+    expect_effects(R"(
+        only net_red on 1
+        only net_14 off 1000/1000
+        only net_blue on 1
+        sig_blue off)");
+
+    night(1);
+    step([] { kiv_led_set_net_led_operation(LED_NET_WHITE, LED_OP_ON, 0, 0, 2); });
+    expect_effects("only net_white off");
+
+    is_night_mode = 2;
+    step([] { kiv_led_set_net_led_operation(LED_NET_WHITE, LED_OP_ON, 0, 0, 2); });
+    expect_effects("only net_white on 2");
+}
+
+DEVICE_TEST(led_groups, RefusesWhatIsNotOfTheGroup)
+{
+    step(operate_what_is_refused);
+    expect_trace(R"(
+        info kiv_mirta_led_operation "enter kiv_led_set_power_led_operation led_id=54,led_operation=0\n"
+        error kiv_mirta_led_operation "led id error!\n"
+        error kiv_mirta_led_operation "kiv_led_set_voicemail_led_operation led_id error\n"
+        error kiv_mirta_led_operation "kiv_led_set_voicemail_led_operation led_id error\n")");
+    night(1);
+    step([] { kiv_led_set_power_led_operation(LED_POWER_54, LED_OP_ON, 0, 0, 1); });
+    expect_trace(R"(
+        info kiv_mirta_led_operation "Night mode check: led_id=54 brightness=0"
+        info kiv_mirta_led_operation "enter kiv_led_set_power_led_operation led_id=54,led_operation=1\n"
+        error kiv_mirta_led_operation "led id error!\n")");
 }
 
 // Each LED is still tried; every failure is one error line with the board's result.
-TEST(led_groups, FailuresAreLoggedAndPassedOver)
+DEVICE_TEST(led_groups, FailuresAreLoggedAndPassedOver)
 {
-    expect_logs("gated groups", R"(
-        6_operation "enter kiv_led_set_sig_led_operation led_id=8,led_operation=0\n"
-        0_operation "set sig blue led fail: -5\n"
-        6_operation "enter kiv_led_set_net_led_operation led_id=15,led_operation=0\n"
-        6_operation "enter kiv_led_set_net_led_off\n" | 0_operation "set net red off fail:-5\n"
-        0_operation "set net blue off fail:-5\n" | 0_operation "set net white off fail:-5\n"
-        0_operation "set net led fail: -5\n"
-        6_operation "enter kiv_led_set_wifi_led_operation led_id=43,led_operation=0\n"
-        0_operation "set 43  fail:-5\n" | 6_operation "enter kiv_led_set_sig_led_off\n"
-        0_operation "set sig blue off fail:-5\n" | 6_operation "enter kiv_led_set_power_led_off\n"
-        0_operation "set power blue off fail:-5\n" | 6_operation "kiv_led_set_wifi_led_off"
-        0_operation "set wifi blue off fail:-5\n")",
-        [] { fail_all(); kiv_led_set_sig_led_operation(8, 0, 0, 0, 3); kiv_led_set_net_led_operation(15, 0, 0, 0, 2);
-             kiv_led_set_wifi_led_operation(43, 0, 0, 0, 2); switch_each_group_off(); });
-    expect_logs("groups of four", R"(
-        6_operation "enter kiv_led_set_bat_led_operation led_id=1,led_operation=0\n"
-        6_operation "kiv_led_set_bat_led_off" | 0_operation "set bat red off fail: -5\n"
-        0_operation "set bat green off fail:-5\n" | 0_operation "set bat blue off fail:-5\n"
-        0_operation "set bat yellow off fail:-5\n" | 0_operation "set 1  fail:-5\n"
-        6_operation "kiv_led_set_rssi_led_off" | 0_operation "set rssi red off fail: -5\n"
-        0_operation "set rssi green off fail:-5\n" | 0_operation "set rssi blue off fail:-5\n"
-        0_operation "set rssi yellow off fail:-5\n" | 6_operation "kiv_led_set_voice_led_off"
-        0_operation "set voice red off fail: -5\n" | 0_operation "set voice green off fail:-5\n"
-        0_operation "set voice blue off fail:-5\n" | 0_operation "set voice yellow off fail:-5\n"
-        6_operation "kiv_led_set_voicemail_led_off" | 0_operation "set voicemail red off fail: -5\n"
-        0_operation "set voicemail green off fail:-5\n" | 0_operation "set voicemail blue off fail:-5\n"
-        0_operation "set voicemail yellow off fail:-5\n" | 0_operation "set 63  off fail:-5\n")",
-        [] { fail_all(); kiv_led_set_bat_led_operation(1, 0, 0, 0, 4); kiv_led_set_rssi_led_off();
-             kiv_led_set_voice_led_off(); kiv_led_set_voicemail_led_off();
-             kiv_led_set_voicemail_led_operation(63, 1, 0, 0, 0); });
+    for (int id = 0; id <= LED_SIGBAR_0; ++id) {
+        fake_platform().led_results[id] = -5;
+    }
+    fake_platform().led_results[LED_SIGBAR_15] = -6;
+    step(switch_each_group_off);
+    expect_log("kiv_mirta_led_operation", R"(
+        info "enter kiv_led_set_sig_led_off\n"
+        error "set sig blue off fail:-5\n"
+        info "enter kiv_led_set_net_led_off\n"
+        error "set net red off fail:-5\n"
+        error "set net blue off fail:-5\n"
+        error "set net white off fail:-5\n"
+        info "kiv_led_set_rssi_led_off"
+        error "set rssi red off fail: -5\n"
+        error "set rssi green off fail:-5\n"
+        error "set rssi blue off fail:-5\n"
+        error "set rssi yellow off fail:-5\n"
+        info "enter kiv_led_set_power_led_off\n"
+        error "set power blue off fail:-5\n"
+        info "kiv_led_set_bat_led_off"
+        error "set bat red off fail: -5\n"
+        error "set bat green off fail:-5\n"
+        error "set bat blue off fail:-5\n"
+        error "set bat yellow off fail:-5\n"
+        info "kiv_led_set_wifi_led_off"
+        error "set wifi blue off fail:-5\n"
+        info "kiv_led_set_sms_led_off"
+        error "set sms green off fail:-5\n"
+        error "set sms blue off fail:-5\n"
+        info "kiv_led_set_flow_led_off"
+        error "set flow red off fail: -5\n"
+        error "set flow yellow off fail:-5\n"
+        error "set flow green off fail:-5\n"
+        error "set flow blue off fail:-5\n"
+        info "kiv_led_set_voicemail_led_off"
+        error "set voicemail red off fail: -5\n"
+        error "set voicemail green off fail:-5\n"
+        error "set voicemail blue off fail:-5\n"
+        error "set voicemail yellow off fail:-5\n"
+        info "kiv_led_set_voice_led_off"
+        error "set voice red off fail: -5\n"
+        error "set voice green off fail:-5\n"
+        error "set voice blue off fail:-5\n"
+        error "set voice yellow off fail:-5\n"
+        info "kiv_led_set_sigbar_led_off"
+        error "set sigbar 66 off fail:-5\n"
+        error "set sigbar 81 off fail:-6\n")");
+
+    fake_platform().led_results.clear();
+    for (const int id : {6, 13, 17, 43, 45, 50, 52, 63, 70}) { // those that it asks for
+        fake_platform().led_results[id] = -7;
+    }
+    step(operate_each_group);
+    expect_errors(R"(
+        error kiv_mirta_led_operation "set sig blue led fail: -7\n"
+        error kiv_mirta_led_operation "set net red off fail:-7\n"
+        error kiv_mirta_led_operation "set net white off fail:-7\n"
+        error kiv_mirta_led_operation "set net led fail: -7\n"
+        error kiv_mirta_led_operation "set rssi green off fail:-7\n"
+        error kiv_mirta_led_operation "set 45  fail:-7\n"
+        error kiv_mirta_led_operation "set power led fail: -7\n"
+        error kiv_mirta_led_operation "set 43  fail:-7\n"
+        error kiv_mirta_led_operation "set sms blue off fail:-7\n"
+        error kiv_mirta_led_operation "set 50  fail:-7\n"
+        error kiv_mirta_led_operation "set voicemail green off fail:-7\n"
+        error kiv_mirta_led_operation "set 63  fail:-7\n"
+        error kiv_mirta_led_operation "set 63  off fail:-7\n"
+        error kiv_mirta_led_operation "set sigbar 70 off fail:-7\n"
+        error kiv_mirta_led_operation "set 70  fail:-7\n"
+        error kiv_mirta_led_operation "set 13  fail:-7\n")");
 }
 
-TEST(led_groups, NightModeGate)
+// A board library that writes its result only on failure: what failed before does not stick to the next LED.
+DEVICE_TEST(led_groups, ResultsAreClearedBeforeEachRequest)
 {
-    expect_effects("net dims, its other colours and the gated rest go dark", R"(
-        net off | led 13 blink 400/400 1 | net off | led 14 off 1000/1000 0 | led 43 off 400/1600 0 |led 8 off
-        led 52 off | bat off | led 1 on 4 | led 17 on 2)",
-        [] { night(0); kiv_led_set_net_led_operation(13, 2, 400, 400, 2);
-             kiv_led_set_net_led_operation(14, 2, 1000, 1000, 1); kiv_led_set_wifi_led_operation(43, 2, 400, 1600, 2);
-             kiv_led_set_sig_led_operation(8, 0, 0, 0, 3); kiv_led_set_power_led_operation(52, 0, 0, 0, 2);
-             kiv_led_set_bat_led_operation(1, 0, 0, 0, 4); kiv_led_set_led_operation(17, 0, 0, 0, 2); });
-    expect_logs("dark nets, logged as off", R"(
-        6_operation "Night mode check: led_id=17 brightness=0"
-        6_operation "enter kiv_led_set_net_led_operation led_id=17,led_operation=1\n"
-        6_operation "enter kiv_led_set_net_led_off\n" | 6_operation "Night mode check: led_id=54 brightness=0"
-        6_operation "enter kiv_led_set_power_led_operation led_id=54,led_operation=1\n"
-        0_operation "led id error!\n")",
-        [] { night(1); kiv_led_set_net_led_operation(17, 0, 0, 0, 2);
-             kiv_led_set_power_led_operation(54, 0, 0, 0, 1); });
-    expect_effects("any value but 1 is day", "led 8 on 3",
-        [] { night(1); is_night_mode = 2; kiv_led_set_sig_led_operation(8, 0, 0, 0, 3); });
+    fake_platform().writes_failures_only = true;
+    fake_platform().led_results[LED_BAT_RED] = -5;
+    step(kiv_led_set_bat_led_off);
+    expect_errors(R"(
+        error kiv_mirta_led_operation "set bat red off fail: -5\n")");
 }
-// clang-format on

@@ -1,69 +1,301 @@
-#include "policy/singlechip/relight.h"
-
+// The single-chip terminal: power, sleep, relight.
 #include "harness.h"
+#include "policy/singlechip/setters.h"
 
-#include <gtest/gtest.h>
-
-static void on()
+static void on_with_lte()
 {
-    product_on(LED_PRODUCT_UNI_CORE_CPE);
-    nv("network_type", "LTE"), nv("signalbar", "2"), nv("wifi_onoff_state", "1");
+    switched_on(LED_PRODUCT_UNI_CORE_CPE);
+    nv("network_type", "LTE");
+    nv("signalbar", "2");
+    nv("wifi_onoff_state", "1");
 }
 
-static void off_charge_and_relight()
+// On, in a data call whose allowance is used up.
+static void reminding()
 {
-    led_power_state = POWER_OFF_CHARGE, kiv_led_handle_relight_msg();
+    on_with_lte();
+    led_net_type = 4;
+    nv("data_volume_limit_switch", "1");
+    nv("data_volume_limit_unit", "time");
+    nv("monthly_time", "1");
+    notify(KIV_MODULE_PPP, REG_PPP_STATUS, "1");
+    fire_timers(5000);
+    expect_effects(R"(
+        only net_blue on 2
+        timer 5000 repeat
+        timer 1000 repeat)");
 }
 
-// Calls and what they cause stand side by side.
-// clang-format off
-TEST(singlechip, PowerEvents)
+DEVICE_TEST(single_chip, PowerOn)
 {
-    expect_effects("power on", "led 52 on 2 | net off | led 15 on 2 | led 8 on 2 | led 43 on 2 | power 1 sleep 0",
-        [] { on(); led_power_state = POWER_NOT_YET; led_bsp_ready = 0; mc(0x40); note_power(); });
-    expect_effects("shutting down",
-        "led 52 off | led 43 off | net off | led 8 off |" + reverser + "4096\" | power 2 sleep 0",
-        [] { on(); mc(0x20); note_power(); });
-    expect_effects("shutting down while resetting keeps all white",
-        "led 52 off | led 43 off | net off | led 8 off | led 52 on 2 | led 43 on 2 | led 17 on 2 | led 8 on 3 |" +
-        reverser + "4097\" |" + reverser + "4096\" | power 7 sleep 0",
-        [] { on(); mc(0x80); mc(0x20); note_power(); });
-    expect_effects("unreal is off, restarting keeps the state", R"(
-        led 52 off | led 43 off | net off | led 8 off | power 1 sleep 0 | led 52 off | led 43 off | net off
-        led 8 off | power 2 sleep 0)", [] { on(); mc(0x100); note_power(); mc(0x800); note_power(); });
-    expect_effects("handheld's events and battery", "power 1 sleep 0",
-        [] { on(); mc(0x400); mc(2); mc(0x40000010); mc(0x200); mc(0x40000200); mc(0x40000400); mc(0x40004000);
-             note_power(); });
+    on_with_lte();
+    led_power_state = POWER_NOT_YET;
+    led_bsp_ready = 0;
+    notify(KIV_MODULE_MAIN, REG_MC_EVENT_POWERON);
+    expect_effects(R"(
+        power_blue on 2
+        only net_blue on 2
+        sig_blue on 2
+        wifi_blue on 2)");
+    expect_log("kiv_mirta_led", R"(
+        info "recv REG_MC_EVENT_POWERON \n"
+        info "enter kiv_singelchip_led_set_led_when_power_on\n"
+        error "recv nettype LTE\n"
+        info "enter kiv_led_handle_nwinfoStatus : 4\n "
+        info "kiv_set_net_led_state :state changed!\n"
+        info "enter kiv_set_net_led_state type=4 , ppp=0\n"
+        info "recv_nwSigStatus :2"
+        info "kiv_led_handle_signal_state :2"
+        info "kiv_qt330x_set_led_signal_state: sig = 2"
+        info "enter kiv_led_set_led_wifi_init\n"
+        info "WIFI status: 1\n"
+        info "enter kiv_led_set_led_wifi_status wifi_status=1, cur_led_sleep_status=0\n"
+        info "wifi blue on\n")");
+    EXPECT_EQ(int{led_power_state}, POWER_ON);
 }
 
-TEST(singlechip, SleepIsFive)
+DEVICE_TEST(single_chip, ShuttingDown)
 {
-    expect_effects("asleep, then 1 wakes up", R"(
-        net off | led 8 off | power 1 sleep 1 | net off | led 15 on 2 | led 6 on 4 | timer 5000 repeat "" = 1
-        power 1 sleep 0)",
-        [] { on(); mc(0x40);
-             led_ppp_state = 1; forget(); notify(27, 1, "5"); notify(10, 0x10, "0"); nv("signalbar", "3");
-             notify(23, 1); nv("signalbar", "2"); note_power(); notify(27, 1, "1"); note_power(); });
-    expect_effects("each power state", "net off | led 8 off | led 6 off | power 2 sleep 0",
-        [] { on(); led_power_state = POWER_OFF; notify(27, 1, "5"); notify(27, 1, "0"); note_power(); });
+    reminding();
+    notify(KIV_MODULE_MAIN, REG_MC_EVENT_SHUTTING_DOWN);
+    expect_effects(R"(
+        deleted timer 1000
+        only net_blue on 2
+        deleted timer 5000
+        power_blue off
+        wifi_blue off
+        net off
+        sig_blue off
+        sent MAIN cmd 12034 source 38 len 8 event 0x20000000 "4096" 8)");
+    expect_log("kiv_mirta_led", R"(
+        info "recv REG_MC_EVENT_SHUTTING_DOWN \n"
+        info "enter kiv_singelchip_led_set_led_when_power_off\n"
+        info "enter kiv_set_net_led_state type=4 , ppp=1\n"
+        info "enter kiv_singlechip_330x_led_set_all_leds_off\n"
+        info "kiv_led_send_common_reverser_msg: send common reverser success.\n")");
+    EXPECT_EQ(int{led_power_state}, POWER_OFF);
 }
 
-TEST(singlechip, Relight)
+DEVICE_TEST(single_chip, ShuttingDownWhileResettingKeepsAllWhite)
 {
-    expect_effects("as it was, also asleep", R"(
-        led 8 on 2 | led 52 on 2 | led 43 on 2 | net off | led 15 on 2 | led 8 on 2 | led 52 on 2 | led 43 off
-        net off | led 15 on 2)",
-        [] { on(); mc(0x40); forget(); command(6934); cur_led_sleep_status = 1; command(6934); });
-    expect_calls("too hot", R"(
-        0 "Enter kiv_led_handle_relight_msg" | 0 "kiv_cpe_led_relight_signal_state, OVER TEMP!"
-        6_operation "enter kiv_led_set_sig_led_operation led_id=8,led_operation=2\n" | led 8 blink 1000/1000 3
-        6_operation "enter kiv_led_set_power_led_operation led_id=52,led_operation=0\n" | led 52 on 2
-        nv wifi_onoff_state 64 | nv wifi_chip1_wps_state 64 | nv wifi_chip2_wps_state 64
-        6 "WIFI status:   WPS status: ,\n" | 6 "wifi_wps_state: wifi led off\n" | 6 "wifi led off\n"
-        6_operation "kiv_led_set_wifi_led_off" | led 43 off | 6 "enter kiv_set_net_led_state type=0 , ppp=0\n"
-        0 "Exit kiv_led_handle_relight_msg")",
-        [] { led_power_state = POWER_ON; over_temp_enable = 1; is_over_temp = 1; kiv_led_handle_relight_msg(); });
-    expect_logs("off", R"(0 "Enter kiv_led_handle_relight_msg" | 0 "Power OFF, Ignore relight msg!!")",
-        off_charge_and_relight);
+    reminding();
+    notify(KIV_MODULE_MAIN, REG_MC_EVENT_RESETTING);
+    expect_effects(R"(
+        deleted timer 1000
+        only net_blue on 2
+        deleted timer 5000
+        power_blue off
+        wifi_blue off
+        net off
+        sig_blue off
+        power_blue on 2
+        wifi_blue on 2
+        net_white on 2
+        sig_blue on 3
+        sent MAIN cmd 12034 source 38 len 8 event 0x20000000 "4097" 8)");
+    expect_log("kiv_mirta_led", R"(
+        info "recv REG_MC_EVENT_RESETTING \n"
+        info "enter kiv_singelchip_led_set_led_when_resetting\n"
+        info "enter kiv_set_net_led_state type=4 , ppp=1\n"
+        info "enter kiv_singlechip_330x_led_set_all_leds_off\n"
+        info "kiv_singlechip_led_set_all_white_leds_on start!\n"
+        info "kiv_led_send_common_reverser_msg: send common reverser success.\n")");
+    notify(KIV_MODULE_MAIN, REG_MC_EVENT_SHUTTING_DOWN);
+    expect_effects(R"(
+        sent MAIN cmd 12034 source 38 len 8 event 0x20000000 "4096" 8)");
+    expect_log("kiv_mirta_led", R"(
+        info "recv REG_MC_EVENT_SHUTTING_DOWN \n"
+        info "enter kiv_singelchip_led_set_led_when_power_off\n"
+        info "Now is ressetting, needn't close led\n"
+        info "kiv_led_send_common_reverser_msg: send common reverser success.\n")");
+    EXPECT_EQ(int{led_power_state}, POWER_RESETTING);
 }
-// clang-format on
+
+DEVICE_TEST(single_chip, RestartingKeepsTheState)
+{
+    reminding();
+    notify(KIV_MODULE_MAIN, REG_MC_EVENT_RESTARTING);
+    expect_effects(R"(
+        power_blue off
+        wifi_blue off
+        net off
+        sig_blue off)");
+    expect_log("kiv_mirta_led", R"(
+        info "recv REG_MC_EVENT_RESTARTING \n"
+        info "enter kiv_singlechip_330x_led_set_all_leds_off\n")");
+    EXPECT_EQ(int{led_power_state}, POWER_ON);
+}
+
+DEVICE_TEST(single_chip, UnrealIsOff)
+{
+    reminding();
+    notify(KIV_MODULE_MAIN, REG_MC_EVENT_POWER_OFF_UNREADL);
+    expect_effects(R"(
+        deleted timer 1000
+        only net_blue on 2
+        deleted timer 5000
+        power_blue off
+        wifi_blue off
+        net off
+        sig_blue off)");
+    expect_log("kiv_mirta_led", R"(
+        info "recv REG_MC_EVENT_POWER_OFF_UNREADL \n"
+        info "enter kiv_singelchip_led_set_led_when_power_off\n"
+        info "enter kiv_set_net_led_state type=4 , ppp=1\n"
+        info "enter kiv_singlechip_330x_led_set_all_leds_off\n")");
+    EXPECT_EQ(int{led_power_state}, POWER_OFF);
+}
+
+DEVICE_TEST(single_chip, HearsOfABatteryAndShowsNothing)
+{
+    on_with_lte();
+    for (const uint32_t event :
+         {REG_MC_CHARGIN_STATUS, REG_MC_BATTERY_VALUE, REG_MC_EVENT_POWER_OFF_CHARGE, REG_MC_EVENT_INITAL,
+          REG_MC_EVENT_POWER_OFF_QUICKEN, REG_MC_EVENT_POWER_OFF_CHARGE_QUICKEN, REG_MC_EVENT_POWER_OFF_QUICKEN_ACK}) {
+        notify(KIV_MODULE_MAIN, event);
+    }
+    expect_effects("");
+    expect_log("kiv_mirta_led", R"(
+        info "recv REG_MC_CHARGIN_STATUS\n"
+        info "recv REG_MC_BATTERY_VALUE\n"
+        info "recv REG_MC_EVENT_POWER_OFF_CHARGE \n")");
+    EXPECT_EQ(int{led_power_state}, POWER_ON);
+}
+
+DEVICE_TEST(single_chip, SleepIsFive)
+{
+    reminding();
+    notify(KIV_MODULE_SLEEP, REG_SLEEP_STATUS_EVENT, "5");
+    expect_effects(R"(
+        deleted timer 1000
+        only net_blue on 2
+        deleted timer 5000
+        net off
+        sig_blue off)");
+    expect_log("kiv_mirta_led", R"(
+        info "recv REG_SLEEP_STATUS_EVENT p_data=5\n"
+        info "enter kiv_singlechip_led_handle_sleep_status_change sleep_status=5\n"
+        info "start power led breathe \n"
+        info "enter kiv_set_net_led_state type=4 , ppp=1\n"
+        info "enter kiv_singlechip_led_set_all_leds_off_when_sleep\n")");
+    EXPECT_EQ(int{cur_led_sleep_status}, 1);
+
+    notify(KIV_MODULE_NWINFO, REG_NWINFO_SIG_BAR);
+    expect_effects("");
+    notify(KIV_MODULE_SLEEP, REG_SLEEP_STATUS_EVENT, "1"); // awake
+    expect_effects(R"(
+        only net_blue on 2
+        sig_6 off
+        sig_blue on 2
+        timer 5000 repeat)");
+    expect_log("kiv_mirta_led", R"(
+        info "recv REG_SLEEP_STATUS_EVENT p_data=1\n"
+        info "enter kiv_singlechip_led_handle_sleep_status_change sleep_status=1\n"
+        info " start wakeup \n"
+        info "enter kiv_singlechip_led_set_led_when_wakeup\n"
+        info "enter kiv_set_net_led_state type=4 , ppp=1\n"
+        error "recv nettype LTE\n"
+        info "enter kiv_led_handle_nwinfoStatus : 4\n "
+        info "kiv_set_net_led_state :state same!\n"
+        info "recv_nwSigStatus :2"
+        info "kiv_led_handle_signal_state :2"
+        info "kiv_qt330x_set_led_signal_state: sig = 2")");
+    expect_log("kiv_led_data_limit", R"(
+        info "[info] enter the pppStatus fun p_data:1\n"
+        info "[info]PPP connect, start check data remind\n"
+        info "[IN FUNC]:kiv_led_start_remind_data_limit_check\n")");
+    EXPECT_EQ(int{cur_led_sleep_status}, 0);
+}
+
+DEVICE_TEST(single_chip, SleepsAlsoWhileOff)
+{
+    on_with_lte();
+    led_power_state = POWER_OFF;
+    notify(KIV_MODULE_SLEEP, REG_SLEEP_STATUS_EVENT, "5");
+    expect_effects(R"(
+        net off
+        sig_blue off)");
+    notify(KIV_MODULE_SLEEP, REG_SLEEP_STATUS_EVENT, "0");
+    expect_effects("sig_6 off");
+}
+
+// What is remembered of the signal shows on an LED of its own at wake-up.
+DEVICE_TEST(single_chip, SignalStatusAtWakeUp)
+{
+    for (int state = -1; state <= 6; ++state) {
+        step([state] { kiv_singlechip_led_set_sigal_status(state); });
+    }
+    expect_effects(R"(
+        sig_6 off
+        sig_6 blink 800/1200 4
+        sig_6 on 4
+        sig_6 on 4
+        sig_6 on 4
+        sig_6 on 4)");
+}
+
+DEVICE_TEST(single_chip, Relight)
+{
+    on_with_lte();
+    notify(KIV_MODULE_MAIN, REG_MC_EVENT_POWERON);
+    nv("wifi_chip2_wps_state", "1");
+    expect_effects(R"(
+        power_blue on 2
+        only net_blue on 2
+        sig_blue on 2
+        wifi_blue on 2)");
+    command(KIV_MSG_CMD_LED_RELIGHT_MSG);
+    expect_effects(R"(
+        sig_blue on 2
+        power_blue on 2
+        wifi_blue blink 400/1600 2
+        only net_blue on 2)");
+    expect_log("kiv_mirta_led", R"(
+        error "Enter kiv_led_handle_relight_msg"
+        error "kiv_cpe_led_relight_signal_state, NOT OVER TEMP!"
+        info "kiv_qt330x_set_led_signal_state: sig = 2"
+        info "WIFI status: 1  WPS status: ,1\n"
+        info "WPS active, wifi blue blink 2 mins\n"
+        info "enter kiv_set_net_led_state type=4 , ppp=0\n"
+        error "Exit kiv_led_handle_relight_msg")");
+
+    cur_led_sleep_status = 1; // only the Wi-Fi LED stays dark
+    command(KIV_MSG_CMD_LED_RELIGHT_MSG);
+    expect_effects(R"(
+        sig_blue on 2
+        power_blue on 2
+        wifi_blue off
+        only net_blue on 2)");
+
+    led_power_state = POWER_OFF_CHARGE;
+    command(KIV_MSG_CMD_LED_RELIGHT_MSG);
+    expect_effects("");
+    expect_log("kiv_mirta_led", R"(
+        error "Enter kiv_led_handle_relight_msg"
+        error "Power OFF, Ignore relight msg!!")");
+}
+
+DEVICE_TEST(single_chip, EveryCallOfARelightWhileTooHot)
+{
+    switched_on(LED_PRODUCT_UNI_CORE_CPE);
+    over_temp_enable = 1;
+    is_over_temp = 1;
+    command(KIV_MSG_CMD_LED_RELIGHT_MSG);
+    expect_calls(R"(
+        error kiv_mirta_led "Enter kiv_led_handle_relight_msg"
+        error kiv_mirta_led "kiv_cpe_led_relight_signal_state, OVER TEMP!"
+        info kiv_mirta_led_operation "enter kiv_led_set_sig_led_operation led_id=8,led_operation=2\n"
+        sig_blue blink 1000/1000 3
+        info kiv_mirta_led_operation "enter kiv_led_set_power_led_operation led_id=52,led_operation=0\n"
+        power_blue on 2
+        nv wifi_onoff_state 64
+        nv wifi_chip1_wps_state 64
+        nv wifi_chip2_wps_state 64
+        info kiv_mirta_led "WIFI status:   WPS status: ,\n"
+        info kiv_mirta_led "wifi_wps_state: wifi led off\n"
+        info kiv_mirta_led "wifi led off\n"
+        info kiv_mirta_led_operation "kiv_led_set_wifi_led_off"
+        wifi_blue off
+        info kiv_mirta_led "enter kiv_set_net_led_state type=0 , ppp=0\n"
+        error kiv_mirta_led "Exit kiv_led_handle_relight_msg")");
+}

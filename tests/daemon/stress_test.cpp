@@ -1,9 +1,10 @@
 // Everything that runs beside the receive thread, at once: for the thread sanitizer, and for deadlocks.
 #include "alarms/kiv_led_over_temp.h"
-#include "core/bsp_ind.h"
+#include "boot.h"
 #include "core/channel.h"
-#include "core/led_ctx.h"
 #include "fake_platform.h"
+#include "ground/led_ctx.h"
+#include "kiv/reg.h"
 #include "nightmode/kiv_led_night_mode.h"
 #include "nightmode/kiv_led_tr181.h"
 
@@ -18,45 +19,82 @@
 #include <unistd.h>
 #include <vector>
 
-// clang-format off
-constexpr std::array modules = {1, 1, 1, 3, 5, 10, 16, 23, 24, 27, 43, 99};
-constexpr std::array events = {0x1, 0x2, 0x4, 0x10, 0x20, 0x40, 0x40, 0x80, 0x100, 0x200, 0x400, 0x800, 0x1000, 0x2000,
-                               0x43, 0x40000010, 0x40000200, 0x40000400, 0x40004000};
+struct events_of_module {
+    uint16_t module;
+    std::vector<uint32_t> events;
+};
+static const std::array notifications = {
+    events_of_module{KIV_MODULE_MAIN,   {REG_MC_CHARGIN_STATUS, REG_MC_EVENT_SHUTTING_DOWN, REG_MC_EVENT_POWERON} },
+    events_of_module{KIV_MODULE_MAIN,   {REG_MC_EVENT_POWERON, REG_MC_EVENT_RESETTING, REG_MC_EVENT_RESTARTING}   },
+    events_of_module{KIV_MODULE_MAIN,   {REG_MC_EVENT_INITAL, REG_MC_EVENT_POWER_OFF_CHARGE, REG_MC_BATTERY_VALUE}},
+    events_of_module{KIV_MODULE_MAIN,   {REG_MC_EVENT_POWER_OFF_QUICKEN, REG_MC_EVENT_POWER_OFF_QUICKEN_ACK}      },
+    events_of_module{KIV_MODULE_MAIN,   {REG_MC_EVENT_POWER_OFF_UNREADL, REG_MC_EVENT_POWER_OFF_CHARGE_QUICKEN}   },
+    events_of_module{KIV_MODULE_PPP,    {REG_PPP_STATUS, REG_Q6_PPP_STATUS}                                       },
+    events_of_module{KIV_MODULE_SMS,    {REG_WMS_SMS_NV_UNREAD_SMS, REG_WMS_SMS_NEW_SMS, REG_WMS_SMS_MEMORY_FULL} },
+    events_of_module{KIV_MODULE_SMS,    {REG_WMS_SMS_VOCEMAIL_SET_FLAG}                                           },
+    events_of_module{KIV_MODULE_WLAN,   {REG_WLAN_CURRENT_STATUS, REG_WLAN_AP_WPS_STATE}                          },
+    events_of_module{KIV_MODULE_MDM,    {REG_SIM_STATUS}                                                          },
+    events_of_module{KIV_MODULE_NWINFO, {REG_NWINFO_SIG_BAR, REG_NWINFO_ROAMING_STATUS, REG_NWINFO_NETTYPE}       },
+    events_of_module{KIV_MODULE_DST,    {REG_DST_FLOW_STATUS}                                                     },
+    events_of_module{KIV_MODULE_SLEEP,  {REG_SLEEP_STATUS_EVENT}                                                  },
+    events_of_module{KIV_MODULE_VOICE,  {REG_VOICE_PHONE_LED_STATE}                                               },
+};
+constexpr std::array commands = {KIV_MSG_CMD_LED_OVER_TEMP_MSG, KIV_MSG_CMD_LED_NIGHT_MODE_MSG,
+                                 KIV_MSG_CMD_LED_RELIGHT_MSG};
 constexpr std::array payloads = {"0", "1", "2", "5", "PHONE BLINK", "PHONE LED ON", ""};
-constexpr std::array keys = {"battery_value", "battery_charging", "battery_exist", "network_type", "signalbar",
-                             "wifi_onoff_state", "sms_nvunread_count", "night_mode_switch", "night_mode_start_time",
-                             "night_mode_end_time", "night_mode_close_all_led", "nitz_sync_flag", "monthly_tx_bytes",
-                             "data_volume_limit_switch", "data_volume_limit_size", "thermal_led_enable", "RadioOff"};
-constexpr std::array values = {"0", "1", "2", "80", "LTE", "SA", "23:59", "0:01"};
-// clang-format on
+constexpr std::array nv_keys = {
+    "battery_value",
+    "battery_charging",
+    "battery_exist",
+    "network_type",
+    "signalbar",
+    "wifi_onoff_state",
+    "sms_nvunread_count",
+    "night_mode_switch",
+    "night_mode_start_time",
+    "night_mode_end_time",
+    "night_mode_close_all_led",
+    "nitz_sync_flag",
+    "monthly_tx_bytes",
+    "data_volume_limit_switch",
+    "data_volume_limit_size",
+    "thermal_led_enable",
+    "RadioOff",
+};
+constexpr std::array nv_values = {"0", "1", "2", "80", "LTE", "SA", "23:59", "0:01"};
+constexpr std::array indications = {1350, 1351, 1355, 1356, 1357};
+
+enum source : size_t { RECEIVE_THREAD, TIMER_THREAD, IPC_THREAD, TR181_THREAD, MAIN_THREAD, SOURCES };
 
 static std::atomic<bool> running;
-static std::array<std::atomic<unsigned long>, 5> counts; // by source
+static std::array<std::atomic<unsigned long>, SOURCES> counts;
 
-template <typename Table> static auto any_of(const Table &table, std::minstd_rand &random)
+template <typename Table> static const auto &any_of(const Table &table, std::minstd_rand &random)
 {
     return table[random() % table.size()];
 }
 
-// Commands make one message in eight; now and then the message is cut short.
+// Commands make one message in eight; one in sixteen is cut short.
 static std::string any_message(std::minstd_rand &random)
 {
+    const events_of_module &any = any_of(notifications, random);
     svc_msg message = {};
     message.us_cmd = MSG_CMD_SERVICE_NOTIFY;
     if (random() % 8 == 0) {
-        message.us_cmd = static_cast<uint16_t>(KIV_MSG_CMD_LED_OVER_TEMP_MSG + random() % 3);
+        message.us_cmd = static_cast<uint16_t>(any_of(commands, random));
     }
     message.us_dest_module_id = KIV_MODULE_LED;
-    message.us_source_module_id = static_cast<uint16_t>(any_of(modules, random));
-    message.ul_event_mask = static_cast<uint32_t>(any_of(events, random));
+    message.us_source_module_id = any.module;
+    message.ul_event_mask = any_of(any.events, random);
     std::strcpy(message.p_data, any_of(payloads, random));
-    return {reinterpret_cast<const char *>(&message), random() % 16 == 0 ? random() % sizeof message : sizeof message};
+    const size_t length = random() % 16 == 0 ? random() % sizeof message : sizeof message;
+    return {reinterpret_cast<const char *>(&message), length};
 }
 
 static void receive(std::minstd_rand &random)
 {
     static received_message received;
-    fake_set_nv(any_of(keys, random), any_of(values, random));
+    fake_set_nv(any_of(nv_keys, random), any_of(nv_values, random));
     fake_deliver(any_message(random));
     kiv_led_receive_message(received);
 }
@@ -71,7 +109,7 @@ static void fire_timers(std::minstd_rand &)
 static void indicate(std::minstd_rand &random)
 {
     char record[1] = {};
-    kiv_led_bspIpcCallBack(1350 + static_cast<int>(random() % 8), 0, random() % 16 == 0 ? nullptr : record);
+    fake_platform().indication(any_of(indications, random), 0, random() % 16 == 0 ? nullptr : record);
 }
 
 static void publish(std::minstd_rand &)
@@ -93,7 +131,7 @@ static void run(void (*source)(std::minstd_rand &), size_t index)
     while (running.load(std::memory_order_relaxed)) {
         source(random);
         counts[index].fetch_add(1, std::memory_order_relaxed);
-        std::this_thread::sleep_for(std::chrono::microseconds(index == 0 ? 0 : 100));
+        std::this_thread::sleep_for(std::chrono::microseconds(index == RECEIVE_THREAD ? 0 : 100));
     }
 }
 
@@ -118,14 +156,14 @@ TEST(stress, AllSourcesAtOnce)
 {
     const char *text = std::getenv("KIV_STRESS_SECONDS");
     const std::chrono::milliseconds duration(text == nullptr ? 3000 : 1000 * std::atol(text));
-    fake_platform().sensors = {50, 90};
-    fake_platform().nv = {
-        {"data_volume_limit_unit", "data"  },
-        {"monthly_rx_bytes",       "1"     },
-        {"systime_mode",           "manual"}
-    };
-    fake_platform().charger = {0, 1};
-    fake_platform().battery = {0, 1};
+    fake_device &device = fake_platform();
+    device.sensors = {50, 90};
+    device.nv["data_volume_limit_unit"] = "data";
+    device.nv["monthly_rx_bytes"] = "1";
+    device.nv["systime_mode"] = "manual";
+    device.charger = {0, 1};
+    device.battery = {0, 1};
+    ASSERT_EQ(boot("MODULE"), 0);           // the one product on which the board has a callback to call
     const int printed = dup(STDOUT_FILENO); // the night-mode check prints
     ASSERT_NE(std::freopen("/dev/null", "w", stdout), nullptr);
     for (int product = 0; product < LED_PRODUCT_COUNT; ++product) {
@@ -133,9 +171,10 @@ TEST(stress, AllSourcesAtOnce)
     }
     std::fflush(stdout);
     dup2(printed, STDOUT_FILENO);
-    std::printf(
-        "%lu messages, %lu rounds of timers, %lu indications, %lu publications, %lu set-ups, %lu LED requests\n",
-        counts[0].load(), counts[1].load(), counts[2].load(), counts[3].load(), counts[4].load(), fake_led_requests());
+    std::printf("%lu messages, %lu rounds of timers, %lu indications, %lu publications, %lu set-ups, "
+                "%lu LED requests\n",
+                counts[RECEIVE_THREAD].load(), counts[TIMER_THREAD].load(), counts[IPC_THREAD].load(),
+                counts[TR181_THREAD].load(), counts[MAIN_THREAD].load(), fake_led_requests());
     for (const std::atomic<unsigned long> &count : counts) {
         EXPECT_GT(count, 10u);
     }

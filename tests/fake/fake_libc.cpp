@@ -39,7 +39,7 @@ static int open_rolling_leds()
 int __wrap_open(const char *path, int flags, ...)
 {
     if (std::strcmp(path, "/sys/class/leds/led:rolling_leds/brightness") == 0) {
-        fake_note("open rolling_leds");
+        fake_note("open led:rolling_leds");
         return open_rolling_leds();
     }
     va_list arguments;
@@ -51,19 +51,19 @@ int __wrap_open(const char *path, int flags, ...)
 
 int __wrap_system(const char *command)
 {
-    fake_note(std::string("system ") + command);
+    fake_note(std::string("shell ") + command);
     return -1;
 }
 
 unsigned __wrap_sleep(unsigned seconds)
 {
-    fake_note("sleep " + std::to_string(seconds));
+    fake_note("sleep " + std::to_string(seconds) + " s");
     return 0;
 }
 
 int __wrap_usleep(useconds_t microseconds)
 {
-    fake_note("usleep " + std::to_string(microseconds));
+    fake_note("sleep " + std::to_string(microseconds) + " us");
     return 0;
 }
 

@@ -1,5 +1,6 @@
 #include "fake_platform.h"
 
+#include "fake_words.h"
 #include "kiv/cfg.h"
 #include "kiv/ipc.h"
 #include "kiv/led.h"
@@ -19,10 +20,10 @@
 #include <string_view>
 #include <utility>
 
-constexpr size_t longest_record = 5000;
-constexpr size_t most_timers = 64;
-constexpr int ignored = -1;     // where the daemon does not look at the result
-constexpr size_t long_run = 20; // from here on a run of one character is shown as x{20}
+constexpr size_t LONGEST_RECORD = 5000;
+constexpr size_t MOST_TIMERS = 64;
+constexpr int IGNORED = -1;    // where the daemon does not look at the result
+constexpr int LED_LOG_ID = 31; // of the daemon
 
 static fake_device device;
 static std::mutex device_mutex; // also guards the record; never held while a timer's procedure runs
@@ -64,25 +65,6 @@ struct device_lock {
     device_lock(const device_lock &) = delete;
 };
 
-static std::string quoted(std::string_view text)
-{
-    std::string shown = "\"";
-    for (size_t i = 0; i < text.size();) {
-        const size_t end = std::min(text.find_first_not_of(text[i], i), text.size());
-        const unsigned char c = static_cast<unsigned char>(text[i]);
-        char one[8];
-        std::snprintf(one, sizeof one, c == '\n' ? "\\n" : c < ' ' || c > '~' ? "\\x%02x" : "%c", c);
-        if (end - i >= long_run) {
-            shown += one + ("{" + std::to_string(end - i) + "}");
-            i = end;
-        } else {
-            shown += one;
-            ++i;
-        }
-    }
-    return shown + "\"";
-}
-
 __attribute__((format(printf, 1, 2))) static void say(const char *format, ...)
 {
     if (!recording.load(std::memory_order_relaxed)) {
@@ -94,25 +76,6 @@ __attribute__((format(printf, 1, 2))) static void say(const char *format, ...)
     std::vsnprintf(line, sizeof line, format, arguments);
     va_end(arguments);
     fake_note(line);
-}
-
-// The bytes that are not zero, by offset: whatever else a message should hold shows up here.
-static std::string dump(const void *data, size_t size)
-{
-    const char *bytes = static_cast<const char *>(data);
-    std::string shown;
-    if (!recording.load(std::memory_order_relaxed)) {
-        return shown;
-    }
-    for (size_t i = 0; i < size; ++i) {
-        if (bytes[i] == 0) {
-            continue;
-        }
-        const std::string_view run(bytes + i, strnlen(bytes + i, size - i));
-        shown += " " + std::to_string(i) + ":" + quoted(run);
-        i += run.size();
-    }
-    return shown;
 }
 
 fake_device &fake_platform()
@@ -130,9 +93,14 @@ void fake_note(const std::string &line)
     if (!recording.load(std::memory_order_relaxed)) {
         return;
     }
-    const device_lock lock;
-    if (++recorded_lines <= longest_record) {
-        record += line + "\n";
+    {
+        const device_lock lock;
+        if (++recorded_lines <= LONGEST_RECORD) {
+            record += line + "\n";
+        }
+    }
+    if (device.meanwhile) {
+        device.meanwhile(line);
     }
 }
 
@@ -143,7 +111,7 @@ std::string fake_take_record()
     return std::exchange(record, {});
 }
 
-static std::optional<fake_timer> take_timer(int handle)
+static std::optional<fake_timer> take_timer(int handle, bool for_good)
 {
     const device_lock lock;
     const auto found = device.timers.find(handle);
@@ -151,7 +119,7 @@ static std::optional<fake_timer> take_timer(int handle)
         return std::nullopt;
     }
     const fake_timer timer = found->second;
-    if (!timer.repeats) {
+    if (for_good || !timer.repeats) {
         device.timers.erase(found);
     }
     return timer;
@@ -159,7 +127,7 @@ static std::optional<fake_timer> take_timer(int handle)
 
 bool fake_fire(int handle)
 {
-    const std::optional<fake_timer> timer = take_timer(handle);
+    const std::optional<fake_timer> timer = take_timer(handle, false);
     if (timer) {
         timer->callback(timer->argument);
     }
@@ -199,13 +167,14 @@ void kiv_syslog_append(int level, const char *file, int, int log_id, const char 
     if (!recording.load(std::memory_order_relaxed)) {
         return;
     }
-    const std::string foreign_id = log_id == 31 ? "" : "/" + std::to_string(log_id);
-    say("log %d%s %s %s", level, foreign_id.c_str(), file, quoted(text).c_str());
+    const char *name = level == KIV_LOG_ERROR ? "error" : level == KIV_LOG_INFO ? "info" : "unknown";
+    const std::string foreign_id = log_id == LED_LOG_ID ? "" : "/" + std::to_string(log_id);
+    say("%s%s %s %s", name, foreign_id.c_str(), file, quoted(text).c_str());
 }
 
 int kiv_init_msg(const char *queue_name, int *handle)
 {
-    say("queue %s", queue_name);
+    say("open %s", queue_name);
     const device_lock lock;
     if (device.failing_queue_opens > 0) {
         --device.failing_queue_opens;
@@ -217,13 +186,13 @@ int kiv_init_msg(const char *queue_name, int *handle)
 
 int kiv_send_msg(const char *queue_name, const void *data, int length)
 {
-    say("send %s %d%s", queue_name, length, dump(data, static_cast<size_t>(length)).c_str());
+    say("sent %s %d bytes%s", queue_name, length, words_of_bytes(data, static_cast<size_t>(length)).c_str());
     return device.send_result;
 }
 
 int kiv_recv_msg(int handle, void *buffer, int size)
 {
-    say("recv %d %d", handle, size);
+    say("receive %d %d", handle, size);
     const device_lock lock;
     if (device.inbox.empty()) {
         return -1;
@@ -240,40 +209,42 @@ int kiv_recv_msg(int handle, void *buffer, int size)
 
 int kiv_msg_send(const svc_msg *message, int data_len)
 {
-    say("send %d %d%s", message->us_dest_module_id, data_len, dump(message, sizeof *message).c_str());
+    say("sent %s %d", words_of_message(*message).c_str(), data_len);
     return device.send_result;
 }
 
 void kiv_mem_set(void *dest, int value, size_t size)
 {
-    say("mem_set %d %zu", value, size);
+    say("fill %d %zu", value, size);
     std::memset(dest, value, size);
 }
 
 void kiv_mem_cpy(void *dest, const void *src, size_t size)
 {
-    say("mem_cpy %zu", size);
+    say("copy %zu", size);
     std::memcpy(dest, src, size);
 }
 
 int kiv_reg_proc(int source_module_id, const uint32_t *masks)
 {
-    say("reg_proc %d %x %x %x %x", source_module_id, masks[0], masks[1], masks[2], masks[3]);
+    say("registered %s 0x%x 0x%x 0x%x 0x%x", word_of_module(source_module_id).c_str(), masks[0], masks[1], masks[2],
+        masks[3]);
     return device.reg_proc_result;
 }
 
 int kiv_reg_func(int source_module_id, int dest_module_id, const reg_masks *masks)
 {
-    say("reg %d %d %x %x %x %x", source_module_id, dest_module_id, masks->mask1, masks->mask2, masks->mask3,
-        masks->mask4);
-    return ignored;
+    say("register %s for %s 0x%x 0x%x 0x%x 0x%x", word_of_module(source_module_id).c_str(),
+        word_of_module(dest_module_id).c_str(), masks->mask1, masks->mask2, masks->mask3, masks->mask4);
+    device.registrations[source_module_id] = *masks;
+    return IGNORED;
 }
 
 int kiv_cfg_get_item(int item, void *buffer, int size)
 {
     say("cfg %d %d", item, size);
     const auto found = device.cfg.find(item);
-    if (found == device.cfg.end()) {
+    if (device.cfg_fails || found == device.cfg.end()) {
         return -1;
     }
     std::memcpy(buffer, found->second.data(), std::min(found->second.size(), static_cast<size_t>(size)));
@@ -294,9 +265,10 @@ int kiv_nvconfig_read(const char *key, char *buffer, int size)
 
 int kiv_nvconfig_write(const char *key, const char *value, int length)
 {
-    say("nv write %s \"%s\" %d", key, value, length);
-    fake_set_nv(key, std::string(value, static_cast<size_t>(length)));
-    return ignored;
+    const std::string text(value, static_cast<size_t>(length));
+    fake_note(std::string("nv written ") + key + "=" + text);
+    fake_set_nv(key, text);
+    return IGNORED;
 }
 
 static int new_timer(const fake_timer &timer)
@@ -307,7 +279,7 @@ static int new_timer(const fake_timer &timer)
         return 0;
     }
     device.timers[++last_timer] = timer;
-    if (device.timers.size() > most_timers) {
+    if (device.timers.size() > MOST_TIMERS) {
         device.timers.erase(device.timers.begin());
     }
     return last_timer;
@@ -315,51 +287,37 @@ static int new_timer(const fake_timer &timer)
 
 int kiv_timer(void (*callback)(void *), void *argument, int period_ms, int repeat)
 {
-    const int handle = new_timer({callback, argument, repeat != 0});
-    say("timer %d %s \"%s\" = %d", period_ms, repeat != 0 ? "repeat" : "once", static_cast<const char *>(argument),
-        handle);
+    const int handle = new_timer({callback, argument, period_ms, repeat != 0});
+    say("timer %d %s%s", period_ms, repeat != 0 ? "repeat" : "once", handle == 0 ? " fails" : "");
     return handle;
 }
 
 int kiv_delete_timer(int handle)
 {
-    say("delete %d", handle);
-    const device_lock lock;
-    device.timers.erase(handle);
-    return ignored;
-}
-
-// All five fields: what is not shown is 0.
-static void note_request(const led_request &request)
-{
-    static constexpr std::array<const char *, 3> names = {"on", "off", "blink"};
-    const size_t operation = static_cast<size_t>(request.led_operation);
-    char line[80];
-    int length = std::snprintf(line, sizeof line, "led %d %s", request.led_id, names.at(operation));
-    const bool blinks = request.blink_time1 != 0 || request.blink_time2 != 0;
-    if (blinks) {
-        length += std::sprintf(line + length, " %d/%d", request.blink_time1, request.blink_time2);
-    }
-    if (operation != LED_OP_OFF || request.brightness != 0 || blinks) {
-        std::sprintf(line + length, " %d", request.brightness);
-    }
-    fake_note(line);
+    const std::optional<fake_timer> timer = take_timer(handle, true);
+    const std::string period = timer ? std::to_string(timer->period_ms) : handle == 0 ? "none" : "gone";
+    say("deleted timer %s", period.c_str());
+    return IGNORED;
 }
 
 int kiv_bsp_set_leds_sync(led_request request, int *result)
 {
     if (recording.load(std::memory_order_relaxed)) {
-        note_request(request);
+        fake_note(words_of(request));
     }
     led_requests.fetch_add(1, std::memory_order_relaxed);
     const auto found = device.led_results.find(request.led_id);
-    *result = found == device.led_results.end() ? 0 : found->second;
-    return ignored;
+    if (found != device.led_results.end()) {
+        *result = found->second;
+    } else if (!device.writes_failures_only) {
+        *result = 0;
+    }
+    return IGNORED;
 }
 
 static int answer(const char *query, const std::optional<bsp_query_result> &scripted, bsp_query_result *result)
 {
-    say("%s %d %d", query, result->ret, result->data);
+    say("query %s%s", query, result->ret == 0 && result->data == 0 ? "" : " with an old answer");
     if (!scripted) {
         return -1;
     }
@@ -380,25 +338,58 @@ int kiv_bsp_get_sensor_temp_sync(int sensor_id, bsp_sensor_temp *temp)
 
 static int note_indication(const char *name, bsp_ind_callback callback)
 {
-    say("ind %s%s", name, callback == nullptr ? " null" : "");
-    return ignored;
+    say("indications of %s", name);
+    device.indication = callback;
+    return IGNORED;
 }
 
 int libkiv_tr181_set_tbl(int table_id, void *data, int arg3, int arg4)
 {
-    say("tr181 %d %d %d%s", table_id, arg3, arg4, dump(data, KIV_TR181_RECORD_SIZE).c_str());
+    say("tr181 %d %d %d %s", table_id, arg3, arg4, words_of_tr181(table_id, data).c_str());
     return device.tr181_result;
 }
 
-// clang-format off
-int kiv_reg_table_init(int module_id) { say("reg_table %d", module_id); return 0; }
-int kiv_ipc_init(int log_id, int flag) { say("ipc %d %d", log_id, flag); return 0; }
-int kiv_lib_led_relight_msg(void) { say("relight"); return ignored; }
-int libkiv_tr181_Init(void) { say("tr181_init"); return ignored; }
-int kiv_bsp_get_charger_connect_status_sync(bsp_query_result *to) { return answer("charger", device.charger, to); }
-int kiv_bsp_get_battery_online_status_sync(bsp_query_result *to) { return answer("battery", device.battery, to); }
-int kiv_bsp_register_battery_online_ind(bsp_ind_callback call) { return note_indication("battery_online", call); }
-int kiv_bsp_register_battery_offline_ind(bsp_ind_callback call) { return note_indication("battery_offline", call); }
-int kiv_bsp_register_charger_connect_ind(bsp_ind_callback call) { return note_indication("charger_connect", call); }
-int kiv_bsp_register_charger_disconnect_ind(bsp_ind_callback to) { return note_indication("charger_disconnect", to); }
-// clang-format on
+int kiv_reg_table_init(int module_id)
+{
+    say("registration table of %d", module_id);
+    return 0;
+}
+int kiv_ipc_init(int log_id, int flag)
+{
+    say("ipc %d %d", log_id, flag);
+    return 0;
+}
+int kiv_lib_led_relight_msg(void)
+{
+    say("relight");
+    return IGNORED;
+}
+int libkiv_tr181_Init(void)
+{
+    say("tr181_init");
+    return IGNORED;
+}
+int kiv_bsp_get_charger_connect_status_sync(bsp_query_result *to)
+{
+    return answer("charger", device.charger, to);
+}
+int kiv_bsp_get_battery_online_status_sync(bsp_query_result *to)
+{
+    return answer("battery", device.battery, to);
+}
+int kiv_bsp_register_battery_online_ind(bsp_ind_callback call)
+{
+    return note_indication("battery_online", call);
+}
+int kiv_bsp_register_battery_offline_ind(bsp_ind_callback call)
+{
+    return note_indication("battery_offline", call);
+}
+int kiv_bsp_register_charger_connect_ind(bsp_ind_callback call)
+{
+    return note_indication("charger_connect", call);
+}
+int kiv_bsp_register_charger_disconnect_ind(bsp_ind_callback to)
+{
+    return note_indication("charger_disconnect", to);
+}

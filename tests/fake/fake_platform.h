@@ -3,10 +3,12 @@
 #pragma once
 
 #include "kiv/adabsp.h"
+#include "kiv/reg.h"
 
 #include <array>
 #include <ctime>
 #include <deque>
+#include <functional>
 #include <map>
 #include <optional>
 #include <string>
@@ -14,6 +16,7 @@
 struct fake_timer {
     void (*callback)(void *);
     void *argument;
+    int period_ms;
     bool repeats;
 };
 
@@ -25,11 +28,17 @@ struct fake_device {
     std::optional<bsp_query_result> charger;   // without a value the query fails
     std::optional<bsp_query_result> battery;
     std::deque<std::optional<std::string>> inbox; // received next; without a value, and at the end, receiving fails
+    bool cfg_fails = false;
     int failing_queue_opens = 0;
     int failing_timers = 0;
     int reg_proc_result = 1;
     int send_result = 0;
     int tr181_result = 0;
+    bool writes_failures_only = false; // an LED request that succeeds leaves its result code alone
+
+    std::map<int, reg_masks> registrations;                 // by the module that is to notify
+    bsp_ind_callback indication = nullptr;                  // as registered
+    std::function<void(const std::string &line)> meanwhile; // called at every recorded call, on the caller's thread
 
     // The C library, for programs that link fake_libc.
     std::optional<std::time_t> clock;                 // UTC; without a value the real one

@@ -1,7 +1,7 @@
 // Turns scenarios into inputs of the receive target: make_seeds FOLDER SCENARIO...
 #include "kiv/adabsp.h"
+#include "language/scenario.h"
 #include "receive_input.h"
-#include "scenario.h"
 
 #include <algorithm>
 #include <cstdio>
@@ -35,8 +35,8 @@ static void add_file(std::string &seed, const std::filesystem::path &path, const
         seed[0] = static_cast<char>(product);
     } else if (path.parent_path() == "nv" && key != input_nv_keys.end()) {
         seed += {STEP_NV, static_cast<char>(key - input_nv_keys.begin())};
-        seed += static_cast<char>(there ? std::min<size_t>(text.size(), missing_nv - 1) : missing_nv);
-        seed += text.substr(0, missing_nv - 1);
+        seed += static_cast<char>(there ? std::min<size_t>(text.size(), MISSING_NV - 1) : MISSING_NV);
+        seed += text.substr(0, MISSING_NV - 1);
     } else if (name.starts_with("sensor_")) {
         seed += {STEP_SENSOR, static_cast<char>(name.back() - '0'), static_cast<char>(there ? std::stoi(text) : -128)};
     } else if (name == "charger" || name == "battery") {
@@ -54,11 +54,11 @@ static void add(std::string &seed, const std::vector<statement> &statements)
             add_file(seed, file.path, file.text.value_or(""), file.text.has_value());
         }
         if (each.what == verb::SEND) {
-            const std::string message = each.bytes.substr(0, longest_input_message);
+            const std::string message = each.bytes.substr(0, LONGEST_INPUT_MESSAGE);
             seed += STEP_MESSAGE;
             seed += two_bytes(message.size()) + message;
         } else if (each.what == verb::INDICATE) {
-            const int id = std::stoi(each.bytes) - first_input_indication;
+            const int id = std::stoi(each.bytes) - FIRST_INPUT_INDICATION;
             seed += {STEP_INDICATION, static_cast<char>((id & 0xf) | (each.bytes.ends_with("null") ? 0x80 : 0))};
         } else if (each.what == verb::AFTER) {
             seed += {STEP_TIMER, 0, STEP_TIMER, 1};
@@ -81,7 +81,7 @@ int main(int argc, char **argv)
             std::fprintf(stderr, "%s: %s\n", argv[i], error.c_str());
             continue;
         }
-        std::string seed(1 + input_state_words, '\0');
+        std::string seed(1 + INPUT_STATE_WORDS, '\0');
         add(seed, story.statements);
         std::ofstream(std::filesystem::path(argv[1]) / std::filesystem::path(argv[i]).stem()) << seed;
     }

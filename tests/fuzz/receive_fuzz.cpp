@@ -2,15 +2,11 @@
 #include "fake_platform.h"
 #include "receive_input.h"
 
-#include "alarms/kiv_led_data_limit.h"
-#include "alarms/kiv_led_over_temp.h"
-#include "core/bsp_ind.h"
+#include "boot.h"
 #include "core/channel.h"
-#include "core/led_ctx.h"
-#include "nightmode/kiv_led_night_mode.h"
+#include "ground/led_ctx.h"
+#include "kiv/reg.h"
 #include "policy/cpe/state.h"
-#include "policy/standard/sms.h"
-#include "policy/standard/voice.h"
 
 #include <algorithm>
 #include <cstdio>
@@ -30,7 +26,7 @@ struct state_word {
     int values; // 0: any signed byte
 };
 
-static const std::array<state_word, input_state_words> state_words = {
+static const std::array<state_word, INPUT_STATE_WORDS> state_words = {
     {
      {led_bsp_ready, 2},
      {led_power_state, 8},
@@ -57,6 +53,7 @@ static const std::array<state_word, input_state_words> state_words = {
 
 static received_message received;
 static unsigned long messages;
+static bsp_ind_callback board_callback;
 
 static int take(input &in)
 {
@@ -82,15 +79,37 @@ static std::string take_text(input &in, unsigned length)
     return text;
 }
 
-// Brings the modules' own state back to what it was, so that an input means the same wherever it stands in a run.
+static void receive(std::optional<std::string> message)
+{
+    fake_platform().inbox.push_back(std::move(message));
+    kiv_led_receive_message(received);
+    ++messages;
+}
+
+static void send(uint16_t us_cmd, uint16_t source, uint32_t event)
+{
+    svc_msg message = {};
+    message.us_cmd = us_cmd;
+    message.us_dest_module_id = KIV_MODULE_LED;
+    message.us_source_module_id = source;
+    message.ul_event_mask = event;
+    receive(std::string(reinterpret_cast<const char *>(&message), sizeof message));
+}
+
+// Brings the modules' own state back to what it was, so that an input means the same wherever it stands in a run: a
+// shut-down ends the reminder and a new message's blink, alarm and night are switched off by empty settings, the phone
+// is quiet.
 static void reset_daemon()
 {
     fake_platform() = {};
-    kiv_led_end_data_limit();
-    kiv_led_over_temp_init();
-    kiv_led_night_mode_init();
-    kiv_led_del_new_sms_timer();
-    recv_voicePhoneStatus("");
+    led_enable = 1;
+    led_product_type = LED_PRODUCT_UFI;
+    led_power_state = POWER_ON;
+    led_sms_state = SMS_NEW;
+    send(MSG_CMD_SERVICE_NOTIFY, KIV_MODULE_MAIN, REG_MC_EVENT_SHUTTING_DOWN);
+    send(KIV_MSG_CMD_LED_OVER_TEMP_MSG, KIV_MODULE_MAIN, 0);
+    send(KIV_MSG_CMD_LED_NIGHT_MODE_MSG, KIV_MODULE_MAIN, 0);
+    send(MSG_CMD_SERVICE_NOTIFY, KIV_MODULE_VOICE, REG_VOICE_PHONE_LED_STATE);
 }
 
 static void set_states(input &in)
@@ -108,16 +127,9 @@ static void set_nv(input &in)
     const char *key = input_nv_keys[static_cast<size_t>(take(in)) % input_nv_keys.size()];
     const unsigned length = static_cast<unsigned>(take(in));
     fake_platform().nv.erase(key);
-    if (length != missing_nv) {
+    if (length != MISSING_NV) {
         fake_platform().nv[key] = take_text(in, length).c_str();
     }
-}
-
-static void receive(std::optional<std::string> message)
-{
-    fake_platform().inbox.push_back(std::move(message));
-    kiv_led_receive_message(received);
-    ++messages;
 }
 
 static void fire(size_t which)
@@ -131,7 +143,7 @@ static void fire(size_t which)
 static void indicate(int choice)
 {
     char record[1] = {};
-    kiv_led_bspIpcCallBack(first_input_indication + (choice & 0xf), 0, (choice & 0x80) != 0 ? nullptr : record);
+    board_callback(FIRST_INPUT_INDICATION + (choice & 0xf), 0, (choice & 0x80) != 0 ? nullptr : record);
 }
 
 static void set_query(input &in)
@@ -154,7 +166,7 @@ static void step(input &in)
     fake_device &device = fake_platform();
     switch (take(in)) {
     case STEP_MESSAGE:
-        receive(take_text(in, take_two(in) % (longest_input_message + 1)));
+        receive(take_text(in, take_two(in) % (LONGEST_INPUT_MESSAGE + 1)));
         break;
     case STEP_NO_MESSAGE:
         receive(std::nullopt);
@@ -216,6 +228,8 @@ int LLVMFuzzerInitialize(int *, char ***)
     if (std::freopen("/dev/null", "w", stdout) == nullptr) {
         return 1;
     }
+    boot("MODULE"); // the one product that registers for the board's indications
+    board_callback = fake_platform().indication;
     return std::atexit([] { std::fprintf(stderr, "%lu messages received\n", messages); });
 }
 

@@ -18,10 +18,10 @@ enum receive_step : char {
     STEP_ENABLED = 'e',      // lowest bit: the LED function
 };
 
-constexpr int input_state_words = 20;
-constexpr unsigned longest_input_message = 1100;
-constexpr int first_input_indication = 1348;
-constexpr unsigned missing_nv = 255;
+constexpr int INPUT_STATE_WORDS = 20;
+constexpr unsigned LONGEST_INPUT_MESSAGE = 1100;
+constexpr int FIRST_INPUT_INDICATION = 1348;
+constexpr unsigned MISSING_NV = 255;
 
 constexpr std::array input_nv_keys = {
     "battery_charging",

@@ -9,13 +9,13 @@
 extern "C" int LLVMFuzzerInitialize(int *argc, char ***argv);
 extern "C" int LLVMFuzzerTestOneInput(const uint8_t *data, size_t size);
 
-constexpr size_t cuts = 64;
+constexpr size_t CUTS = 64;
 
 static void replay(const std::filesystem::path &path)
 {
     std::ifstream file(path, std::ios::binary);
     const std::vector<char> whole{std::istreambuf_iterator<char>(file), {}};
-    const size_t pace = whole.size() / cuts + 1;
+    const size_t pace = whole.size() / CUTS + 1;
 
     for (size_t length = whole.size() % pace; length <= whole.size(); length += pace) {
         // Exactly as long as the text, so that a sanitizer sees a read behind its end.

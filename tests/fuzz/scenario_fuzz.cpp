@@ -1,6 +1,6 @@
 // The scenario parser over any text. An include finds the text itself again, so that includes nest; a name with a
 // folder grows with every level, until it is long and names an empty file.
-#include "scenario.h"
+#include "language/scenario.h"
 
 #include <cstdint>
 #include <cstdio>
@@ -9,7 +9,7 @@
 extern "C" int LLVMFuzzerInitialize(int *argc, char ***argv);
 extern "C" int LLVMFuzzerTestOneInput(const uint8_t *data, size_t size);
 
-constexpr size_t longest_path = 10;
+constexpr size_t LONGEST_PATH = 10;
 
 int LLVMFuzzerInitialize(int *, char ***)
 {
@@ -24,7 +24,7 @@ int LLVMFuzzerTestOneInput(const uint8_t *data, size_t size)
     const bool parsed = parse_scenario(
         text, "input.scn",
         [&](const std::string &path, std::string &included) {
-            included = path.size() > longest_path ? "" : text;
+            included = path.size() > LONGEST_PATH ? "" : text;
             return !path.ends_with("missing.scn");
         },
         story, error);

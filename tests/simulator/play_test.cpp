@@ -1,5 +1,5 @@
 // The program as a whole, with the daemon itself.
-#include "device.h"
+#include "world/device.h"
 
 #include <cstdio>
 #include <filesystem>
@@ -37,8 +37,9 @@ protected:
         const std::string command = "cd " + place + " && " + SIMULATOR + " run " + options + " a.scn 2>&1";
         outcome result;
         FILE *out = popen(command.c_str(), "r");
-        for (int c = fgetc(out); c != EOF; c = fgetc(out))
+        for (int c = fgetc(out); c != EOF; c = fgetc(out)) {
             result.printed += static_cast<char>(c);
+        }
         result.code = WEXITSTATUS(pclose(out));
         return result;
     }
@@ -56,36 +57,44 @@ struct outcome_row {
 
 // Each is played behind POWERED, whose lines are 1 to 4.
 const outcome_row outcome_rows[] = {
-    {"expect bat_green on 3\n",                                                                          1, "a.scn:5: expected: bat_green on 3\n  shown:    bat_green on 4\n"},
-    {"expect only bat_green on 4\n",                                                                     1, "shown:    bat_green on 4 and net_red on 2\n"                    },
-    {"expect dark\n",                                                                                    1, "a.scn:5: expected: dark\n"                                      },
-    {"after 1s\nexpect requests 1\n",                                                                    1, "shown:    0 LED requests\n"                                     },
-    {"expect log \"recv REG_MC_EVENT_POWERON\" level 0\n",                                               1, "a.scn:5: expected: log"                                         },
-    {"expect no log \"recv REG_MC_EVENT_POWERON\"\n",                                                    1, "a.scn:5: expected: no log"                                      },
-    {"notify SMS NEW_SMS\nexpect timer 10000 repeat\n",                                                  1, "shown:    1 timers, 10000 once\n"                               },
-    {"notify SMS NEW_SMS\nafter 1s\nnotify MAIN SHUTTING_DOWN\nexpect deleted timer\nexpect timers 0\n", 0,
-     "2 expectations held, 1.000 s of device time\n"                                                                                                                         },
-    {"notify MAIN SHUTTING_DOWN\nexpect sent MAIN \"4097\"\n",                                           1, "\"4096\", 8) = 0\n"                                             },
-    {"expect nv is_night_mode=1\n",                                                                      1, "shown:    is_night_mode=\"0\"\n"                                },
-    {"expect ran \"echo\"\n",                                                                            1, "shown:    no shell command\n"                                   },
-    {"expect tr181 DEV.LEDS \"x\"\n",                                                                    1, "shown:    DEV.LEDS does not exist\n"                            },
-    {"kill\nexpect alive\n",                                                                             1, "shown:    the daemon has ended\n"                               },
-    {"start\n",                                                                                          2, "a.scn:5: start: the daemon runs already\n"                      },
-    {"kill\nnotify MAIN POWERON\n",                                                                      2, "a.scn:6: notify MAIN POWERON: the daemon does not run\n"        },
-    {"indication 1356\nkill\nindication 1356\n",                                                         2, "a.scn:7: indication 1356: the daemon does not run\n"            },
-    {"repeat 3\nafter 1000d\nend\nclock jump +1000d\nrepeat 2\nclock jump +1000d\nend\n",                2,
-     "a.scn:10: clock jump +1000d: the clock would leave the years 1970 to 2037\n"                                                                                           },
-    {"fail kiv_recv_msg * 0 2\nexpect nothing\n",                                                        2, "a.scn:6: expect nothing changed\n"                              },
+    {"expect bat_green on 3\n",                                                                                      1, "a.scn:5: expected: bat_green on 3\n  shown:    bat_green on 4\n"},
+    {"expect only bat_green on 4\n",                                                                                 1, "shown:    bat_green on 4 and net_red on 2\n"                    },
+    {"notify VOICE \"PHONE BLINK\"\n",                                                                               1, "a.scn:5: expected: the daemon has registered for this event\n"  },
+    {"notify unregistered VOICE \"PHONE BLINK\"\nexpect no request\n",                                               0, "1 expectation held"                                             },
+    {"notify MAIN POWERON\nexpect nothing changed\nexpect no request\n",                                             1, "a.scn:7: expected: no request\n"                                },
+    {"nv battery_value=10\nrepeat 2\nnotify MAIN BATTERY_VALUE\nend\nexpect bat_red off\n",                          1,
+     "  the front: bat_red blink 800/1200 4 and net_red on 2\n  bat_red, its last requests:\n"                                                                                           },
+    {"notify SMS NEW_SMS\nafter 10s\nexpect sms_blue off\n",                                                         1, "    10.000  on 4  set off by a timer of 10000 ms"               },
+    {"repeat 3\nafter 1s\nexpect bat_green off\nend\n",                                                              1,
+     "  in round 1 of 3 of the repeat at a.scn:5\n  at 1.000 s of device time"                                                                                                           },
+    {"expect dark\n",                                                                                                1, "a.scn:5: expected: dark\n"                                      },
+    {"after 1s\nexpect requests 1\n",                                                                                1, "shown:    0 LED requests\n"                                     },
+    {"expect log \"recv REG_MC_EVENT_POWERON\" level 0\n",                                                           1, "a.scn:5: expected: log"                                         },
+    {"expect no log \"recv REG_MC_EVENT_POWERON\"\n",                                                                1, "a.scn:5: expected: no log"                                      },
+    {"notify SMS NEW_SMS\nexpect timer 10000 repeat\n",                                                              1, "shown:    1 timers, 10000 once\n"                               },
+    {"notify SMS NEW_SMS\nafter 1s\nnotify MAIN SHUTTING_DOWN\nexpect deleted timer\nexpect timers 0\n",             0,
+     "2 expectations held, 1.000 s of device time\n"                                                                                                                                     },
+    {"notify MAIN SHUTTING_DOWN\nexpect sent MAIN \"4097\"\n",                                                       1, "\"4096\", 8) = 0\n"                                             },
+    {"expect nv is_night_mode=1\n",                                                                                  1, "shown:    is_night_mode=\"0\"\n"                                },
+    {"expect ran \"echo\"\n",                                                                                        1, "shown:    no shell command\n"                                   },
+    {"expect tr181 DEV.LEDS \"x\"\n",                                                                                1, "shown:    DEV.LEDS does not exist\n"                            },
+    {"kill\nexpect alive\n",                                                                                         1, "shown:    the daemon has ended\n"                               },
+    {"start\n",                                                                                                      2, "a.scn:5: start: the daemon runs already\n"                      },
+    {"kill\nnotify MAIN POWERON\n",                                                                                  2, "a.scn:6: notify MAIN POWERON: the daemon does not run\n"        },
+    {"indication 1356\nkill\nindication 1356\n",                                                                     2, "a.scn:7: indication 1356: the daemon does not run\n"            },
+    {"repeat 3\nafter 1000d\nend\nclock jump +1000d\nrepeat 2\nclock jump +1000d\nend\n",                            2,
+     "a.scn:10: clock jump +1000d: the clock would leave the years 1970 to 2037\n"                                                                                                       },
+    {"fail kiv_recv_msg * 0 2\nexpect nothing\n",                                                                    2, "a.scn:6: expect nothing changed\n"                              },
  // Killed in the middle of a scene, and started again on the same device.
     {"notify SMS NEW_SMS\nkill\nexpect timers 0\nstart\nexpect requests 2\nnotify MAIN POWERON\nafter 20s\n"
-     "expect bat_green on 4\nexpect alive\n",                                                       0, "4 expectations held, 20.000 s of device time\n"                 },
+     "expect bat_green on 4\nexpect alive\n",                                                                   0, "4 expectations held, 20.000 s of device time\n"                 },
  // A storm counts as one step.
-    {"repeat 50\nnotify MAIN BATTERY_VALUE\nend\nexpect requests 250\n",                                 0, "1 expectation held"                                             },
+    {"repeat 50\nnotify MAIN BATTERY_VALUE\nend\nexpect requests 250\n",                                             0, "1 expectation held"                                             },
     {"fail kiv_bsp_set_leds_sync sms_blue -7\nnotify SMS NEW_SMS\nexpect sms_blue off\nexpect log \"fail:-7\" level "
-     "0\n",                                                                                         0, "2 expectations held"                                            },
- // The receive thread sleeps while the clock stands still, and its queue takes eleven messages at most.
-    {"kill\nsys led:rolling_leds 0\nstart\nrepeat 20\nnotify MAIN POWERON\nend\n",                       2,
-     "a.scn:9: notify MAIN POWERON: the queue is full"                                                                                                                       },
+     "0\n",                                                                                                     0, "2 expectations held"                                            },
+ // The receive thread sleeps for five seconds; what its queue has no room for waits, and none is lost.
+    {"kill\nsys led:rolling_leds 0\nstart\nrepeat 200\nnotify MAIN POWERON\nend\nafter 10s\nexpect requests 2600\n", 0,
+     "1 expectation held"                                                                                                                                                                },
 };
 } // namespace
 
@@ -117,8 +126,9 @@ TEST_F(Play, KeepsTheDeviceOfAFailedRunOnly)
 {
     const auto devices = [&] {
         int count = 0;
-        for (const fs::directory_entry &entry : fs::directory_iterator(place))
+        for (const fs::directory_entry &entry : fs::directory_iterator(place)) {
             count += entry.is_directory();
+        }
         return count;
     };
     play(POWERED + "expect alive\n");
@@ -127,6 +137,59 @@ TEST_F(Play, KeepsTheDeviceOfAFailedRunOnly)
     EXPECT_EQ(devices(), 1);
     play(POWERED + "expect dark\n");
     EXPECT_EQ(devices(), 2);
+}
+
+TEST_F(Play, WritesOverNothingButATrace)
+{
+    const std::string story = POWERED + "expect alive\n";
+    std::string text;
+    EXPECT_EQ(play(story, "--trace a.scn").code, 2);
+    read_file(place + "/a.scn", text);
+    EXPECT_EQ(text, story);
+    EXPECT_EQ(play(story, "--trace .").code, 2);
+    EXPECT_EQ(play(story, "--trace t").code, 0);
+    EXPECT_EQ(play(story, "--trace t").code, 0);
+}
+
+TEST_F(Play, TellsACiSystemWhatFailed)
+{
+    std::ofstream(place + "/good.scn") << POWERED + "expect bat_green on 4\n";
+    const outcome result = play(POWERED + "expect dark\nexpect bat_green off\nexpect alive\n",
+                                "--quiet --keep-going -j 2 --junit out.xml --artifacts out good.scn");
+    EXPECT_EQ(result.code, 1);
+    EXPECT_NE(result.printed.find("2 scenarios, 1 failed, 2 expectations held\n"), std::string::npos) << result.printed;
+    EXPECT_NE(result.printed.find("a.scn:6: expected: bat_green off"), std::string::npos) << result.printed;
+    std::string report;
+    read_file(place + "/out.xml", report);
+    EXPECT_NE(report.find("tests=\"2\" failures=\"1\" errors=\"0\""), std::string::npos) << report;
+    EXPECT_TRUE(fs::exists(place + "/out/a.scn/device/trace"));
+    EXPECT_TRUE(fs::exists(place + "/out/a.scn/timeline"));
+    EXPECT_FALSE(fs::exists(place + "/out/good.scn"));
+}
+
+TEST_F(Play, WarnsOfWhatNobodyMet)
+{
+    const outcome result = play(POWERED + "nv battery_valeu=1\nfail kiv_bsp_set_leds_sync net_16 -5\n");
+    EXPECT_EQ(result.code, 0);
+    for (const char *warning : {"a.scn:5: warning: nobody has read NV 'battery_valeu'",
+                                "a.scn:6: warning: no call of kiv_bsp_set_leds_sync has met this fail",
+                                "a.scn: warning: the scenario expects nothing", "0 expectations held"}) {
+        EXPECT_NE(result.printed.find(warning), std::string::npos) << result.printed;
+    }
+    EXPECT_NE(play("fail kiv_bsp_set_led_sync * -5\n").printed.find("did you mean kiv_bsp_set_leds_sync?"),
+              std::string::npos);
+}
+
+TEST_F(Play, TakesAWrapperInPlaceOfTheDaemon)
+{
+    const fs::path daemon = fs::path(SIMULATOR).parent_path() / "kiv_mirta_led";
+    const std::string wrapper = place + "/wrapper";
+    std::ofstream(wrapper) << "#!/bin/sh\n" << daemon.string() << "\nexit $?\n";
+    fs::permissions(wrapper, fs::perms::owner_all);
+    for (const std::string &option : {"--daemon " + wrapper, std::string("--emulator 'nice -n 1'")}) {
+        const outcome result = play(POWERED + "kill\nstart\nnotify MAIN POWERON\nexpect bat_green on 4\n", option);
+        EXPECT_EQ(result.code, 0) << option << result.printed;
+    }
 }
 
 TEST_F(Play, LeavesTheSameTraceEveryTime)

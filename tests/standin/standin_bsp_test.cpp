@@ -2,11 +2,11 @@
 
 #include "kiv/adabsp.h"
 #include "kiv/ipc.h"
+#include "ubox/uloop.h"
 
 #include <cerrno>
 #include <cstring>
 #include <filesystem>
-#include <libubox/uloop.h>
 #include <sys/socket.h>
 #include <sys/un.h>
 #include <unistd.h>
@@ -16,8 +16,9 @@ struct bsp : standin_device {
     std::string led(const std::string &folder) const
     {
         std::string shown;
-        for (const char *attribute : {"trigger", "brightness", "delay_on", "delay_off"})
+        for (const char *attribute : {"trigger", "brightness", "delay_on", "delay_off"}) {
             shown += read(folder + "/" + attribute);
+        }
         return shown;
     }
 };
@@ -47,9 +48,26 @@ TEST_F(bsp, LedFolderShowsTheRequest)
         EXPECT_EQ(led(row.folder), row.shown) << row.folder;
     }
     EXPECT_EQ(read("leds/led:bat_green/max_brightness"), "4\n");
-    std::filesystem::remove_all(path("leds/led:bat_green"));
-    EXPECT_EQ(set_led({LED_BAT_GREEN, LED_OP_ON, 2, 0, 0}), -ENOENT);
-    EXPECT_EQ(set_led({LED_BAT_GREEN, LED_OP_ON, 2, 0, 0}), 0) << "the folder is made again";
+}
+
+TEST_F(bsp, LedFilesThatAreReplacedAreNoticed)
+{
+    const led_request half = {LED_BAT_GREEN, LED_OP_ON, 2, 0, 0};
+    const std::string folder = path("leds/led:bat_green");
+    EXPECT_EQ(set_led(half), 0);
+    std::filesystem::remove_all(folder);
+    EXPECT_EQ(set_led(half), 0) << "the folder is made again";
+    EXPECT_EQ(led("leds/led:bat_green"), "none\n2\n0\n0\n");
+
+    std::filesystem::rename(folder, path("leds/old"));
+    std::filesystem::create_directory(folder);
+    write("leds/led:bat_green/max_brightness", "255\n");
+    EXPECT_EQ(set_led(half), 0);
+    EXPECT_EQ(read("leds/led:bat_green/brightness"), "128\n");
+
+    std::filesystem::remove(folder + "/brightness");
+    EXPECT_EQ(set_led(half), 0);
+    EXPECT_EQ(read("leds/led:bat_green/brightness"), "128\n");
 }
 
 TEST_F(bsp, RefusesRequestsTheBoardDoesNotKnow)
@@ -65,8 +83,9 @@ TEST_F(bsp, RefusesRequestsTheBoardDoesNotKnow)
         {LED_BAT_GREEN, LED_OP_ON,    -1, 0,  0 },
         {LED_BAT_GREEN, LED_OP_BLINK, 4,  -1, 10},
     };
-    for (const led_request &row : rows)
+    for (const led_request &row : rows) {
         EXPECT_EQ(set_led(row), -EINVAL) << row.led_id << " " << row.led_operation << " " << row.brightness;
+    }
     EXPECT_TRUE(std::filesystem::is_empty(path("leds")));
 }
 
@@ -85,20 +104,24 @@ TEST_F(bsp, DrivesAFolderOfRealLedsThroughItsMap)
     };
     for (const auto &row : rows) {
         std::filesystem::create_directories(path("class/green:status"));
-        for (const char *attribute : {"brightness", "trigger", "delay_on", "delay_off"})
+        for (const char *attribute : {"brightness", "trigger", "delay_on", "delay_off"}) {
             write(std::string("class/green:status/") + attribute, "old text\n");
+        }
         write("class/green:status/max_brightness", row.max);
-        write("map", "# the board's only LED\n\n1 green:status\n999 x\n2 ../leds\n");
+        write("map", "# the board's only LED\n\nbat_green green:status\n999 x\n2 ../leds\n3abc x\n");
         setenv("KIV_LED_MAP", path("map").c_str(), 1);
         testing::internal::CaptureStderr();
         set("KIV_LED_DIR", path("class"));
         EXPECT_EQ(set_led({LED_BAT_GREEN, LED_OP_ON, row.level, 0, 0}), 0);
-        EXPECT_EQ(testing::internal::GetCapturedStderr(),
-                  "platform: " + path("map:4: not a line of LED-ID NAME\n") +
-                      "platform: " + path("map:5: not a line of LED-ID NAME\n"));
+        EXPECT_EQ(testing::internal::GetCapturedStderr(), "platform: " + path("map:4: not a line of LED FOLDER\n") +
+                                                              "platform: " + path("map:5: not a line of LED FOLDER\n") +
+                                                              "platform: " + path("map:6: not a line of LED FOLDER\n"));
         EXPECT_EQ(read("class/green:status/brightness"), row.brightness) << row.level << " of " << row.max;
         EXPECT_EQ(read("class/green:status/trigger"), "none\n");
+        testing::internal::CaptureStderr();
         EXPECT_EQ(set_led({LED_BAT_RED, LED_OP_ON, 4, 0, 0}), -ENOENT) << "real LEDs are not made";
+        EXPECT_EQ(testing::internal::GetCapturedStderr(),
+                  "platform: the LED bat_red, KIV_LED_DIR/led:bat_red, cannot be set: No such file or directory\n");
     }
     EXPECT_FALSE(std::filesystem::exists(path("class/led:bat_red")));
 }
@@ -125,8 +148,9 @@ TEST_F(bsp, SensorsAndQueriesAnswerFromFiles)
         bsp_query_result battery = {-99, -99};
         for (const char *file : {"bsp/sensor_6", "bsp/charger", "bsp/battery"}) {
             std::filesystem::remove(path(file));
-            if (row.file != nullptr)
+            if (row.file != nullptr) {
                 write(file, row.file);
+            }
         }
         const std::string what = row.file ? row.file : "missing";
         EXPECT_EQ(kiv_bsp_get_sensor_temp_sync(6, &temp), row.sensor) << what;
@@ -140,8 +164,9 @@ TEST_F(bsp, SensorsAndQueriesAnswerFromFiles)
     }
     bsp_sensor_temp temp{};
     write("bsp/sensor_7", "45\n");
-    for (const int sensor : {-1, 7})
+    for (const int sensor : {-1, 7}) {
         EXPECT_EQ(kiv_bsp_get_sensor_temp_sync(sensor, &temp), -1) << sensor;
+    }
 }
 
 static std::string calls;

@@ -32,8 +32,9 @@ TEST_F(bus, KeepsMessageBoundaries)
     };
     const int handle = open_queue("MSG_ID_LED");
     const std::string data(1036, 'm');
-    for (const auto &row : rows)
+    for (const auto &row : rows) {
         ASSERT_EQ(kiv_send_msg("MSG_ID_LED", data.data(), row.sent), 0) << row.sent;
+    }
     for (const auto &row : rows) {
         std::string buffer(1040, '.');
         EXPECT_EQ(kiv_recv_msg(handle, buffer.data(), row.room), row.received) << row.sent;
@@ -59,8 +60,9 @@ TEST_F(bus, RefusesWhatCannotBeSent)
     };
     const std::string data(2000, 'm');
     open_queue("MSG_ID_LED");
-    for (const auto &row : rows)
+    for (const auto &row : rows) {
         EXPECT_EQ(kiv_send_msg(row.queue, data.data(), row.length), -1) << (row.queue ? row.queue : "null");
+    }
     EXPECT_EQ(kiv_send_msg("MSG_ID_LED", nullptr, 104), -1);
     EXPECT_EQ(kiv_recv_msg(-1, const_cast<char *>(data.data()), 10), -1);
 }
@@ -69,8 +71,9 @@ TEST_F(bus, FullQueueWaitsThenFailsAndLosesNothing)
 {
     const int handle = open_queue("MSG_ID_LED");
     int accepted = 0;
-    while (standin_send("MSG_ID_LED", &accepted, sizeof accepted, 0) == 0)
+    while (standin_send("MSG_ID_LED", &accepted, sizeof accepted, 0) == 0) {
         accepted++;
+    }
     ASSERT_GT(accepted, 0);
 
     const long long start = now_ms();
@@ -88,8 +91,9 @@ TEST_F(bus, FullQueueWaitsThenFailsAndLosesNothing)
     });
     EXPECT_EQ(kiv_send_msg("MSG_ID_LED", &accepted, sizeof accepted), 0);
     reader.join();
-    for (int value = 0; value <= accepted; value++)
+    for (int value = 0; value <= accepted; value++) {
         EXPECT_EQ(received[static_cast<size_t>(value)], value);
+    }
 }
 
 TEST_F(bus, RoutesByModuleId)
@@ -118,8 +122,9 @@ TEST_F(bus, RoutesByModuleId)
         EXPECT_EQ(kiv_recv_msg(handle, &received, sizeof received), 20) << row.queue;
         EXPECT_EQ(received.us_dest_module_id, row.module_id);
     }
-    for (const int data_len : {-1, 1025, INT32_MAX})
+    for (const int data_len : {-1, 1025, INT32_MAX}) {
         EXPECT_EQ(kiv_msg_send(&message, data_len), -1) << data_len;
+    }
     EXPECT_EQ(kiv_msg_send(&message, 0), 0);
     EXPECT_EQ(kiv_msg_send(&message, 1024), 0);
     for (const int nobody : {0, 2, 37, 39, 65535}) {
@@ -137,10 +142,12 @@ static pid_t start_holder()
     const pid_t child = fork();
     if (child == 0) {
         int handle = -1;
-        if (kiv_init_msg("MSG_ID_LED", &handle) < 0 || ::write(ready[1], "r", 1) != 1)
+        if (kiv_init_msg("MSG_ID_LED", &handle) < 0 || ::write(ready[1], "r", 1) != 1) {
             _exit(1);
-        for (;;)
+        }
+        for (;;) {
             pause();
+        }
     }
     close(ready[1]);
     EXPECT_EQ(::read(ready[0], &byte, 1), 1) << "the holder could not open the queue";
@@ -166,6 +173,27 @@ TEST_F(bus, SecondReaderIsRefusedAndKilledOneReplaced)
     EXPECT_GE(kiv_init_msg("MSG_ID_LED", &handle), 0);
     EXPECT_EQ(kiv_send_msg("MSG_ID_LED", "x", 1), 0);
     EXPECT_EQ(kiv_recv_msg(handle, &byte, 1), 1);
+}
+
+// Whoever owns a module's queue owns its table: a second instance takes nothing from the first.
+TEST_F(bus, SecondInstanceLeavesTheTableAlone)
+{
+    const uint32_t masks[] = {1, 2, 3, 4};
+    int handle = -1;
+    EXPECT_EQ(kiv_reg_table_init(KIV_MODULE_LED), 0);
+    EXPECT_EQ(kiv_init_msg("MSG_ID_LED", &handle), 0);
+    EXPECT_LT(kiv_init_msg("MSG_ID_LED", &handle), 0) << "one reader in a process, too";
+    EXPECT_EQ(kiv_reg_proc(KIV_MODULE_SMS, masks), 1);
+
+    const pid_t second = fork();
+    if (second == 0) {
+        standin_own_nothing();
+        _exit(kiv_reg_table_init(KIV_MODULE_LED) == -1 && kiv_init_msg("MSG_ID_LED", &handle) < 0 ? 0 : 1);
+    }
+    int status = -1;
+    waitpid(second, &status, 0);
+    EXPECT_EQ(status, 0);
+    EXPECT_EQ(read("reg/5"), "0x1 0x2 0x3 0x4\n");
 }
 
 TEST_F(bus, WorksUnderAPathTooLongForASocket)
@@ -205,7 +233,8 @@ TEST_F(bus, RegistrationTableIsKept)
     EXPECT_EQ(read("reg/1"), "0x4 0x0 0x0 0x0\n");
     EXPECT_NE(kiv_reg_proc(0, masks), 1);
     EXPECT_NE(kiv_reg_proc(3, nullptr), 1);
-    for (int module_id = 100; module_id < 163; module_id++)
+    for (int module_id = 100; module_id < 163; module_id++) {
         ASSERT_EQ(kiv_reg_proc(module_id, masks), 1) << module_id;
+    }
     EXPECT_NE(kiv_reg_proc(200, masks), 1) << "the table is full";
 }

@@ -65,8 +65,9 @@ TEST_F(faults, FailedCallIsNotCarriedOut)
     const int queue = open_queue("MSG_ID_LED");
     for (const char *call : {"kiv_nvconfig_read", "kiv_nvconfig_write", "kiv_bsp_get_sensor_temp_sync", "kiv_init_msg",
                              "kiv_msg_send", "kiv_send_msg", "kiv_lib_led_relight_msg", "kiv_recv_msg",
-                             "libkiv_tr181_Init", "kiv_reg_table_init", "kiv_bsp_register_charger_connect_ind"})
+                             "libkiv_tr181_Init", "kiv_reg_table_init", "kiv_bsp_register_charger_connect_ind"}) {
         write(std::string("faults/") + call, "* -3\n");
+    }
     write("faults/kiv_timer", "* 0\n");
     write("faults/kiv_syslog_append", "secret 0\n");
     set("KIV_LOG", path("log"));
@@ -93,4 +94,18 @@ TEST_F(faults, FailedCallIsNotCarriedOut)
     set("KIV_FAULTS", "0");
     EXPECT_EQ(kiv_nvconfig_read("battery_value", buffer, sizeof buffer), 0)
         << "the folder counts only with KIV_FAULTS=1";
+}
+
+// The thousandth line counts as the first does.
+TEST_F(faults, LongFilesAreReadWhole)
+{
+    std::string lines;
+    for (int line = 0; line < 1000; line++) {
+        lines += "no_such_key -7\n";
+    }
+    char buffer[8] = "";
+    write("faults/kiv_nvconfig_read", lines + "last -9 1\n");
+    set("KIV_FAULTS", "1");
+    EXPECT_EQ(kiv_nvconfig_read("last", buffer, sizeof buffer), -9);
+    EXPECT_EQ(kiv_nvconfig_read("last", buffer, sizeof buffer), -1) << "counted down";
 }

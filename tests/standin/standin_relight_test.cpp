@@ -17,20 +17,23 @@ TEST_F(relight, ReachesTheDaemon)
     uint16_t received[518] = {};
     EXPECT_EQ(kiv_lib_led_relight_msg(), 0);
     ASSERT_EQ(kiv_recv_msg(handle, received, sizeof received), 12);
-    for (size_t word = 0; word < 6; word++)
+    for (size_t word = 0; word < 6; word++) {
         EXPECT_EQ(received[word], expected[word]) << word;
+    }
 }
 
 TEST_F(relight, NeitherBlocksNorIsLostWhileTheQueueIsFull)
 {
     const int handle = open_queue("MSG_ID_LED");
     int filler = 0;
-    while (standin_send("MSG_ID_LED", "filler", 6, 0) == 0)
+    while (standin_send("MSG_ID_LED", "filler", 6, 0) == 0) {
         filler++;
+    }
 
     const long long start = now_ms();
-    for (int count = 0; count < RELIGHTS; count++)
+    for (int count = 0; count < RELIGHTS; count++) {
         EXPECT_EQ(kiv_lib_led_relight_msg(), 0);
+    }
     EXPECT_LT(now_ms() - start, STANDIN_SEND_WAIT_MS) << "a call waited for room";
 
     int relights = 0;

@@ -90,8 +90,9 @@ TEST_F(store, NvReaderNeverSeesHalfAValue)
     std::atomic<bool> stop{false};
     ASSERT_EQ(kiv_nvconfig_write("key", shown[0].data(), 1000), 0);
     std::thread writer([&] {
-        for (size_t turn = 0; !stop; turn++)
+        for (size_t turn = 0; !stop; turn++) {
             kiv_nvconfig_write("key", shown[turn % 2].data(), static_cast<int>(shown[turn % 2].size()));
+        }
     });
     for (int turn = 0; turn < 1000; turn++) {
         char buffer[1100] = "";
@@ -128,8 +129,9 @@ TEST_F(store, CfgItems)
         memset(buffer, '#', sizeof buffer);
         const std::string file = "cfg/" + std::to_string(row.item);
         std::filesystem::remove(path(file));
-        if (row.file != nullptr)
+        if (row.file != nullptr) {
             write(file, row.file);
+        }
         const std::string what = file + " " + (row.file ? row.file : "missing");
         EXPECT_EQ(kiv_cfg_get_item(row.item, buffer, row.size), row.result) << what;
         EXPECT_EQ(memcmp(buffer, row.bytes, 4), 0) << what;
@@ -164,8 +166,9 @@ TEST_F(store, DeviceDirectoryOfOthersIsRefused)
     for (const auto &row : rows) {
         char buffer[8] = "";
         int handle = -1;
-        if (row.owner != geteuid() && geteuid() != 0)
+        if (row.owner != geteuid() && geteuid() != 0) {
             continue;
+        }
         ASSERT_EQ(chmod(shared.c_str(), row.mode), 0);
         ASSERT_EQ(chown(shared.c_str(), row.owner, getegid()), 0);
         set("KIV_DEVICE_DIR", shared);
@@ -177,6 +180,44 @@ TEST_F(store, DeviceDirectoryOfOthersIsRefused)
                   "platform: device directory " + shared + " is refused: " + row.reason + "\n");
     }
     EXPECT_TRUE(std::filesystem::is_empty(shared));
+}
+
+TEST_F(store, FoldersOfOthersAndLinksAreRefused)
+{
+    char buffer[8] = "";
+    const std::string device = path("device");
+    for (const char *folder : {"nv", "bus", "faults", "reg", "tr181"}) {
+        std::filesystem::create_directory(device);
+        std::filesystem::create_directory(device + "/" + folder);
+        ASSERT_EQ(chmod((device + "/" + folder).c_str(), 0770), 0);
+        testing::internal::CaptureStderr();
+        set("KIV_DEVICE_DIR", device);
+        EXPECT_EQ(kiv_nvconfig_write("key", "1", 1), -1) << folder;
+        EXPECT_EQ(testing::internal::GetCapturedStderr(), "platform: device directory " + device + "/" + folder +
+                                                              " is refused: others can write to it (mode 0770)\n");
+        std::filesystem::remove_all(device + "/" + folder);
+        std::filesystem::create_directory_symlink(directory, device + "/" + folder);
+        standin_reload();
+        EXPECT_EQ(kiv_nvconfig_write("key", "1", 1), -1) << folder << " is a link";
+        std::filesystem::remove_all(device);
+    }
+    set("KIV_DEVICE_DIR", directory);
+    write("secret", "1\n");
+    std::filesystem::create_symlink(path("secret"), path("nv/key"));
+    EXPECT_EQ(kiv_nvconfig_read("key", buffer, sizeof buffer), -1);
+    EXPECT_EQ(kiv_nvconfig_write("key", "2", 1), 0) << "the link is replaced";
+    EXPECT_EQ(read("secret"), "1\n");
+}
+
+TEST_F(store, RemovedDirectoryIsNoticed)
+{
+    char buffer[8] = "";
+    std::filesystem::remove_all(directory);
+    testing::internal::CaptureStderr();
+    EXPECT_EQ(kiv_nvconfig_read("key", buffer, sizeof buffer), -1);
+    EXPECT_EQ(kiv_nvconfig_write("key", "1", 1), -1);
+    EXPECT_EQ(testing::internal::GetCapturedStderr(),
+              "platform: device directory " + directory + " has been removed\n");
 }
 
 static std::vector<char> led_record(int instance, const char *object_path)
@@ -214,8 +255,9 @@ TEST_F(store, Tr181RefusesPathsThatLeaveItsFolder)
 {
     const std::string endless(40, 'P'); // no terminator inside its field
     ASSERT_EQ(libkiv_tr181_Init(), 0);
-    for (const char *object_path : {"", "../nv/key", ".hidden", "DEV/LEDS", "DEV LEDS", endless.c_str()})
+    for (const char *object_path : {"", "../nv/key", ".hidden", "DEV/LEDS", "DEV LEDS", endless.c_str()}) {
         EXPECT_LT(libkiv_tr181_set_tbl(141, led_record(1, object_path).data(), 1, 0), 0) << object_path;
+    }
     EXPECT_LT(libkiv_tr181_set_tbl(143, led_record(1, "DEV.LEDS").data(), 1, 0), 0);
     EXPECT_LT(libkiv_tr181_set_tbl(141, nullptr, 1, 0), 0);
     EXPECT_TRUE(std::filesystem::is_empty(path("tr181")));

@@ -92,8 +92,9 @@ static long long gap_after_late_tick()
 TEST_F(timers, PeriodicTimerKeepsItsPhaseWithoutABurst)
 {
     long long gap = gap_after_late_tick();
-    for (int attempt = 0; attempt < 9 && gap >= 95; attempt++)
+    for (int attempt = 0; attempt < 9 && gap >= 95; attempt++) {
         gap = gap_after_late_tick();
+    }
     EXPECT_LT(gap, 95);
 }
 
@@ -111,8 +112,9 @@ TEST_F(timers, DeleteTakesOnlyItsOwnTimer)
     const int alive = kiv_timer(record, &two, 40, 0); // takes the place of the one that has fired
     const int stopped = kiv_timer(record, &three, 20, 0);
     EXPECT_NE(alive, gone);
-    for (const int handle : {0, -1, 99999, gone, stopped, stopped})
+    for (const int handle : {0, -1, 99999, gone, stopped, stopped}) {
         EXPECT_EQ(kiv_delete_timer(handle), 0) << handle;
+    }
     EXPECT_EQ(wait_for(2), (std::vector{1, 2}));
 }
 
@@ -122,8 +124,9 @@ TEST_F(timers, RefusesWhatItCannotServe)
     EXPECT_EQ(kiv_timer(record, &one, 0, 0), 0);
     EXPECT_EQ(kiv_timer(record, &one, -5, 1), 0);
     EXPECT_EQ(kiv_timer(nullptr, &one, 10, 1), 0);
-    for (int count = 0; count < 64; count++)
+    for (int count = 0; count < 64; count++) {
         handles.push_back(kiv_timer(record, &one, INT32_MAX, count % 2));
+    }
     EXPECT_EQ(kiv_timer(record, &one, 10, 0), 0) << "the table holds 64";
     for (const int handle : handles) {
         EXPECT_GT(handle, 0);

@@ -9,8 +9,11 @@
 #include "kiv/reg.h"
 #include "kiv/socket.h"
 #include "kiv/tr181.h"
+#include "standin.h"
 
+#include <csignal>
 #include <cstring>
+#include <fcntl.h>
 #include <fstream>
 #include <regex>
 #include <thread>
@@ -23,9 +26,9 @@ TEST_F(traces, OneLineACall)
 {
     char buffer[1036] = "";
     int result = 0;
-    const int led_queue = open_queue("MSG_ID_LED");
+    const int LED_QUEUE = open_queue("MSG_ID_LED");
     const int main_queue = open_queue("MSG_ID_MAIN");
-    const std::string led_text = std::to_string(led_queue);
+    const std::string led_text = std::to_string(LED_QUEUE);
     daemon_record hello{};
     strcpy(hello.process_name, "kiv_mirta_led");
     strcpy(hello.queue_name, "MSG_ID_LED");
@@ -48,9 +51,9 @@ TEST_F(traces, OneLineACall)
     kiv_reg_table_init(38);
     kiv_init_msg("a/b", &result);
     kiv_send_msg("MSG_ID_LED", &hello, 104);
-    kiv_recv_msg(led_queue, buffer, 1036);
+    kiv_recv_msg(LED_QUEUE, buffer, 1036);
     kiv_send_msg("MSG_ID_LED", "short", 5);
-    kiv_recv_msg(led_queue, buffer, 1036);
+    kiv_recv_msg(LED_QUEUE, buffer, 1036);
     kiv_msg_send(&notice, 8);
     kiv_recv_msg(main_queue, buffer, 1036);
     kiv_reg_func(1, 38, &masks);
@@ -68,7 +71,7 @@ TEST_F(traces, OneLineACall)
     kiv_bsp_get_sensor_temp_sync(0, nullptr);
     kiv_delete_timer(0);
     kiv_lib_led_relight_msg();
-    kiv_recv_msg(led_queue, buffer, 1036);
+    kiv_recv_msg(LED_QUEUE, buffer, 1036);
     libkiv_tr181_Init();
 
     const std::vector<std::string> expected = {
@@ -77,8 +80,8 @@ TEST_F(traces, OneLineACall)
         "main kiv_init_msg(\"a/b\") = -1",
         "main kiv_send_msg(\"MSG_ID_LED\", 104) = 0, record 0 \"kiv_mirta_led\" \"MSG_ID_LED\"",
         "main kiv_recv_msg(" + led_text + ", 1036) = 104, record 0 \"kiv_mirta_led\" \"MSG_ID_LED\"",
-        "main kiv_send_msg(\"MSG_ID_LED\", 5) = 0",
-        "main kiv_recv_msg(" + led_text + ", 1036) = 5",
+        "main kiv_send_msg(\"MSG_ID_LED\", 5) = 0, raw 73686f7274",
+        "main kiv_recv_msg(" + led_text + ", 1036) = 5, raw 73686f7274",
         "main kiv_msg_send(dest 1 cmd 12034 source 38 len 8 event 0x20000000 \"4096\", 8) = 0",
         "main kiv_recv_msg(" + std::to_string(main_queue) +
             ", 1036) = 20, cmd 12034 dest 1 source 38 len 8 event 0x20000000 \"4096\"",
@@ -117,16 +120,17 @@ TEST_F(traces, ThreadsHaveNames)
     std::thread([] { kiv_delete_timer(0); }).join();
     static std::atomic<int> handle_fired{0};
     const int timer = kiv_timer([](void *) { handle_fired = 1; }, nullptr, 1, 0);
-    while (handle_fired == 0)
+    while (handle_fired == 0) {
         usleep(1000);
+    }
     const std::string number = std::to_string(handle);
     const std::string fire = "timer kiv_timer_fire(" + std::to_string(timer) + ")";
     std::vector<std::string> lines = trace();
     // The timer may fire before its starter has written its own line.
     std::erase(lines, "main kiv_timer(1, once) = " + std::to_string(timer));
-    EXPECT_EQ(lines, (std::vector<std::string>{"main kiv_send_msg(\"MSG_ID_LED\", 1) = 0", "t1 kiv_delete_timer(0) = 0",
-                                               "receive kiv_recv_msg(" + number + ", 1) = 1",
-                                               "t2 kiv_delete_timer(0) = 0", fire}));
+    EXPECT_EQ(lines, (std::vector<std::string>{
+                         "main kiv_send_msg(\"MSG_ID_LED\", 1) = 0, raw 78", "t1 kiv_delete_timer(0) = 0",
+                         "receive kiv_recv_msg(" + number + ", 1) = 1, raw 78", "t2 kiv_delete_timer(0) = 0", fire}));
 }
 
 // Nothing that comes off the bus or out of a caller may grow a line beyond its buffer or split it.
@@ -143,10 +147,11 @@ TEST_F(traces, HostileTextStaysOnOneBoundedLine)
     kiv_syslog_append(6, "f", 1, 31, "%s", endless.c_str());
     std::vector<std::string> lines = trace();
     ASSERT_EQ(lines.size(), 4U);
-    EXPECT_TRUE(lines[1].ends_with("\\xff\\xff\"")) << "the whole message is shown";
+    EXPECT_NE(lines[1].find("\\xff\\xff\" raw ffff"), std::string::npos) << "the whole message is shown";
     EXPECT_TRUE(lines[2].ends_with(") = -1")) << "a cut line keeps its result";
-    for (const std::string &line : lines)
+    for (const std::string &line : lines) {
         EXPECT_LT(line.size(), 9000U);
+    }
 }
 
 TEST_F(traces, LogLineIsOneLineOfTheSink)
@@ -164,8 +169,9 @@ TEST_F(traces, LogLineIsOneLineOfTheSink)
     };
     const std::regex shape("^20[0-9]{2}-[0-9]{2}-[0-9]{2} [0-9]{2}:[0-9]{2}:[0-9]{2}\\.[0-9]{3} (.*)$");
     set("KIV_LOG", path("log"));
-    for (const auto &row : rows)
+    for (const auto &row : rows) {
         kiv_syslog_append(row.level, "file", 7, 31, "%s", row.text);
+    }
     kiv_syslog_append(6, "file", 7, 31, "%5000d", 1); // cut
     std::ifstream log(path("log"));
     std::string line;
@@ -182,4 +188,33 @@ TEST_F(traces, LogLineIsOneLineOfTheSink)
     const std::string before = read("log");
     kiv_syslog_append(6, "file", 7, 31, "unseen");
     EXPECT_EQ(read("log"), before);
+}
+
+// What is not in the trace did not happen, so nothing goes on without it.
+TEST_F(traces, LostByteEndsTheProcess)
+{
+    EXPECT_EXIT((set("KIV_TRACE", "/dev/full"), kiv_delete_timer(0)), testing::ExitedWithCode(74),
+                "platform: the trace cannot be written: No space left on device");
+    EXPECT_EXIT((set("KIV_TRACE", path("missing/trace")), kiv_delete_timer(0)), testing::ExitedWithCode(74),
+                "platform: KIV_TRACE=.*: No such file or directory");
+}
+
+TEST_F(traces, BrokenStandardErrorStopsNobody)
+{
+    int pipe_fds[2];
+    const int standard_error = dup(STDERR_FILENO);
+    ASSERT_EQ(pipe2(pipe_fds, O_CLOEXEC), 0);
+    dup2(pipe_fds[1], STDERR_FILENO);
+    close(pipe_fds[0]);
+    close(pipe_fds[1]);
+    set("KIV_TRACE", "-");
+    set("KIV_LOG", "-");
+    kiv_syslog_append(0, "file", 7, 31, "to nobody");
+    standin_error("to nobody");
+    EXPECT_EQ(kiv_delete_timer(0), 0);
+    dup2(standard_error, STDERR_FILENO);
+    close(standard_error);
+    sigset_t pending;
+    sigpending(&pending);
+    EXPECT_EQ(sigismember(&pending, SIGPIPE), 0);
 }

@@ -1,7 +1,8 @@
+#include "ubox/uloop.h"
+
 #include <gtest/gtest.h>
 
 #include <atomic>
-#include <libubox/uloop.h>
 #include <thread>
 #include <unistd.h>
 
@@ -11,11 +12,13 @@ static std::atomic<bool> saw_eof{false};
 static void read_byte(uloop_fd *source, unsigned int)
 {
     char byte = 0;
-    if (read(source->fd, &byte, 1) == 1)
+    if (read(source->fd, &byte, 1) == 1) {
         bytes_read++;
+    }
     saw_eof = source->eof;
-    if (byte == 'e' || source->eof)
+    if (byte == 'e' || source->eof) {
         uloop_end();
+    }
 }
 
 struct uloop : testing::Test {

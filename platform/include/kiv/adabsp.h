@@ -46,7 +46,10 @@ enum {
     LED_VOICEMAIL_YELLOW = 65,
     LED_SIGBAR_0 = 66, /* LED_SIGBAR_0 to LED_SIGBAR_15 are 66 to 81 */
     LED_SIGBAR_15 = 81,
+    LED_ID_COUNT, /* ids are below it, with gaps; a new LED stands above this line */
 };
+
+static_assert(LED_ID_COUNT == 82, "whoever keeps something for each LED keeps this many");
 
 enum {
     LED_OP_ON = 0,
@@ -58,8 +61,8 @@ typedef struct led_request {
     int32_t led_id;
     int32_t led_operation;
     int32_t brightness;  /* level 0 to 4; 0 with every off request */
-    int32_t blink_time1; /* ms; 0 unless the operation is blink */
-    int32_t blink_time2; /* ms; 0 unless the operation is blink */
+    int32_t blink_time1; /* ms; 0 with on; with off of no meaning: night mode turns a blink into off as it came */
+    int32_t blink_time2; /* ms; likewise */
 } led_request;
 
 static_assert(sizeof(led_request) == 20, "led_request is passed to the BSP by value");

@@ -11,7 +11,7 @@ enum {
     KIV_CFG_PRODUCT_TYPE_ID = 6000, /* text of up to 127 characters: the product type */
 };
 
-/* Copies the item's value into buffer (at most size bytes; a text of 2 bytes or more is always terminated).
+/* Copies the item's value into buffer, at most size bytes: a text with its terminator, or cut.
  * Returns -1 on failure with the buffer untouched, any other value is success. */
 int kiv_cfg_get_item(int item, void *buffer, int size);
 

@@ -36,7 +36,7 @@ enum {
     /* KIV_MODULE_WLAN */
     REG_WLAN_CURRENT_STATUS = 0x10,
     REG_WLAN_AP_WPS_STATE = 0x80,
-    REG_WLAN_AP_WPS_STATE_CHIP2 = 0x100, /* handled as REG_WLAN_AP_WPS_STATE */
+    REG_WLAN_AP_WPS_STATE_CHIP2 = 0x100, /* the same event under a second value; both are handled alike */
     /* KIV_MODULE_SMS */
     REG_WMS_SMS_NV_UNREAD_SMS = 0x2,
     REG_WMS_SMS_NEW_SMS = 0x4,

@@ -36,6 +36,9 @@ enum {
     MSG_CMD_SERVICE_NOTIFY = 12034,
 };
 
+/* How many messages a queue holds. A sender to a full queue waits. */
+enum { KIV_QUEUE_DEPTH = 10 };
+
 enum {
     KIV_SVC_MSG_SIZE = 1036, /* bytes of every receive buffer, and of svc_msg */
     KIV_SVC_MSG_TEXT_SIZE = 1020,

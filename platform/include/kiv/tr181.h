@@ -14,15 +14,18 @@ enum {
 /* A record: native byte order, unused bytes 0. A parameter's flag is 1 when its value is set. */
 enum {
     KIV_TR181_RECORD_SIZE = 4964,
-    KIV_TR181_INSTANCE = 0,      /* int32, from 1 */
-    KIV_TR181_PATH = 4,          /* NUL-terminated object path, KIV_TR181_PATH_SIZE bytes */
+    KIV_TR181_INSTANCE = 0, /* int32, from 1 */
+    KIV_TR181_PATH = 4,     /* NUL-terminated object path, KIV_TR181_PATH_SIZE bytes */
     KIV_TR181_PATH_SIZE = 34,
-    KIV_TR181_PARAM1_FLAG = 38,  /* uint16 */
-    KIV_TR181_PARAM1 = 64,       /* DEV.LEDS: int32 number of entries; DEV.LEDS.LED: name, 68 bytes */
+    KIV_TR181_PARAM1_FLAG = 38, /* uint16 */
+    KIV_TR181_PARAM1 = 64,      /* DEV.LEDS: int32 number of entries; DEV.LEDS.LED: name */
+    KIV_TR181_PARAM1_SIZE = 68,
     KIV_TR181_PARAM2_FLAG = 134, /* uint16; DEV.LEDS.LED only */
-    KIV_TR181_PARAM2 = 160,      /* status, 36 bytes */
+    KIV_TR181_PARAM2 = 160,      /* status */
+    KIV_TR181_PARAM2_SIZE = 36,
     KIV_TR181_PARAM3_FLAG = 198, /* uint16; DEV.LEDS.LED only */
-    KIV_TR181_PARAM3 = 224,      /* location, 36 bytes */
+    KIV_TR181_PARAM3 = 224,      /* location */
+    KIV_TR181_PARAM3_SIZE = 36,
 };
 
 /* Connects to the store; once, before any write. Returns 0, or -1. */

@@ -1,13 +1,10 @@
-/* A small uloop, source-compatible with the part of libubox that the device's programs use. */
+/* A small uloop, source-compatible with the part of libubox that the device's programs use, and C like it: a C++
+ * program includes it through ubox/uloop.h. */
 #ifndef LIBUBOX_ULOOP_H
 #define LIBUBOX_ULOOP_H
 
 #include <stdbool.h>
 #include <stdint.h>
-
-#ifdef __cplusplus
-extern "C" {
-#endif
 
 struct uloop_fd;
 
@@ -38,7 +35,4 @@ static inline int uloop_run(void)
 void uloop_end(void); /* any thread; the loop returns after the callback that runs */
 void uloop_done(void);
 
-#ifdef __cplusplus
-}
-#endif
 #endif
