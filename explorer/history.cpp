@@ -1,0 +1,178 @@
+#include "history.h"
+
+#include <algorithm>
+
+namespace
+{
+constexpr size_t COMMENT_WIDTH = 116;
+
+struct due_timer {
+    size_t kind = 0;
+    size_t instance = 0;
+    int64_t due_ms = INT64_MAX;
+};
+
+// The next timer to fire, of one purpose or of all.
+due_timer next_due(std::optional<timer_purpose> purpose)
+{
+    due_timer next;
+    for (size_t kind = 0; kind < known_timers().size(); kind++) {
+        if (purpose && known_timers()[kind].purpose != *purpose) {
+            continue;
+        }
+        for (size_t instance = 0; instance < TIMERS_OF_A_KIND; instance++) {
+            const int64_t due_ms = timing.due_ms[kind][instance];
+            if ((world.timers[kind] >> instance & 1) != 0 && due_ms < next.due_ms) {
+                next = {kind, instance, due_ms};
+            }
+        }
+    }
+    return next;
+}
+
+void pass_until(int64_t end_ms)
+{
+    for (due_timer next = next_due({}); next.due_ms <= end_ms; next = next_due({})) {
+        timing.now_ms = next.due_ms;
+        fire_instance(next.kind, next.instance);
+    }
+    timing.now_ms = end_ms;
+}
+
+std::string as_duration(int64_t ms)
+{
+    return ms % 1000 == 0 ? std::to_string(ms / 1000) + "s" : std::to_string(ms) + "ms";
+}
+
+std::string as_text(const led_look &look)
+{
+    const std::string brightness = std::to_string(look.brightness);
+    if (look.mode == led_mode::ON) {
+        return "on " + brightness;
+    }
+    return "blink " + std::to_string(look.blink_time1) + "/" + std::to_string(look.blink_time2) + " " + brightness;
+}
+
+// All that is lit; LED by LED where one shines brighter than a scenario can say.
+std::string as_expectation()
+{
+    constexpr int BRIGHTEST_SAID = 4;
+    std::string only;
+    std::string one_by_one;
+    bool is_sayable = true;
+    for (size_t led = 0; led < world.leds.size(); led++) {
+        if (!is_lit(world.leds[led])) {
+            continue;
+        }
+        const led_look &look = look_at(world.leds[led]);
+        const std::string lit = std::string(led_name(static_cast<int>(led))) + " " + as_text(look);
+        only += (only.empty() ? "expect only " : " and ") + lit;
+        if (look.brightness > BRIGHTEST_SAID) {
+            is_sayable = false;
+        } else {
+            one_by_one += "expect " + lit + "\n";
+        }
+    }
+    return !is_sayable ? one_by_one : (only.empty() ? "expect dark" : only) + "\n";
+}
+
+// Statements one by one, each as it stands; time passes by the clock.
+void play(const stimulus &what, unsigned product)
+{
+    for (const action &one : what.actions) {
+        apply({.text = {}, .actions = {one}, .fires = {}}, product);
+        if (one.what == act::PASS) {
+            pass_until(timing.now_ms + one.ms);
+        }
+    }
+}
+
+bool play_timer(timer_purpose purpose, std::string &text)
+{
+    const due_timer next = next_due(purpose);
+    if (next.due_ms == INT64_MAX) {
+        return false;
+    }
+    text += "after " + as_duration(next.due_ms - timing.now_ms) + "\n";
+    pass_until(next.due_ms);
+    return true;
+}
+
+bool play_step(const stimulus &what, unsigned product, std::string &text)
+{
+    if (what.fires) {
+        return play_timer(*what.fires, text);
+    }
+    text += what.text + (what.text.ends_with('\n') ? "" : "\n");
+    play(what, product);
+    return true;
+}
+
+bool shows(unsigned product, const breach &what)
+{
+    if (what.broken == NO_NOISE || what.broken == NO_TRAP) {
+        return true;
+    }
+    if (what.broken == HEALING || what.broken == FAILURES_HEAL || what.broken == NIGHT_IS_DIM) {
+        return world.leds[static_cast<size_t>(what.led)] == what.shown;
+    }
+    std::vector<breach> found;
+    check_state(product, found);
+    return std::any_of(found.begin(), found.end(), [&](const breach &here) {
+        return here.broken == what.broken && here.led == what.led && here.timer == what.timer;
+    });
+}
+
+unsigned timers_running()
+{
+    unsigned running = 0;
+    for (size_t kind = 0; kind < known_timers().size(); kind++) {
+        running += running_of(kind);
+    }
+    return running;
+}
+
+// What the properties of timers and requests look at, in a scenario's words.
+std::string last_words(const breach &what)
+{
+    if (what.broken == TIMERS_KEPT) {
+        return "expect timers " + std::to_string(timers_running()) + "\n";
+    }
+    return what.broken == NO_NOISE ? "expect requests " + std::to_string(happened.led_requests) + "\n" : "";
+}
+} // namespace
+
+told_history tell_history(unsigned product, const std::vector<stimulus> &alphabet, const std::vector<size_t> &history,
+                          const std::string &epilogue, const breach &what)
+{
+    told_history told;
+    bool is_played = true;
+    furnish(product);
+    timing = {};
+    told.text = furniture(product) + "start\n";
+    apply(stimulus_of("start"), product);
+    told.text += as_expectation();
+    for (const size_t step : history) {
+        is_played &= play_step(alphabet[step], product, told.text);
+        told.text += as_expectation();
+    }
+    if (!epilogue.empty()) {
+        happened = {};
+        is_played &= play_step(stimulus_of(epilogue), product, told.text);
+        told.text += as_expectation();
+    }
+    told.text += last_words(what);
+    told.shows = is_played && shows(product, what);
+    return told;
+}
+
+std::string as_comment(std::string_view text)
+{
+    std::string comment;
+    while (text.size() > COMMENT_WIDTH) {
+        const size_t end = text.rfind(' ', COMMENT_WIDTH);
+        comment += "# " + std::string(text.substr(0, end)) + "\n";
+        text.remove_prefix(end + 1);
+    }
+    return comment + "# " + std::string(text) + "\n";
+}

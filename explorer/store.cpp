@@ -1,0 +1,225 @@
+#include "store.h"
+
+#include <cstdio>
+#include <cstdlib>
+#include <cstring>
+#include <sys/mman.h>
+
+namespace
+{
+constexpr size_t RESERVED = size_t{16} << 30;
+constexpr size_t FIRST_TABLE = size_t{1} << 12;
+constexpr unsigned TAG_BITS = 24;
+constexpr uint64_t TAG_MASK = (uint64_t{1} << TAG_BITS) - 1;
+constexpr size_t FIXED_BYTES = 10;
+constexpr size_t SKIP_MOST = 255;
+
+// How a state lies in memory, without gaps; its difference follows.
+struct state_head {
+    uint16_t size; // of the difference
+    uint8_t stimulus;
+    uint8_t marked;
+    uint8_t parent[6]; // its place and 1; 0 for the first state
+};
+static_assert(sizeof(state_head) == FIXED_BYTES);
+
+// Every byte that differs: how many bytes are skipped before it (255: and no byte follows), and the byte.
+struct difference {
+    std::array<std::byte, 2 * SNAPSHOT_MAX> bytes;
+    size_t size;
+};
+
+#define ALL_BYTES __attribute__((no_sanitize("address", "undefined"), noinline))
+
+ALL_BYTES void compare(const snapshot &first, const snapshot &now, size_t size, difference &out)
+{
+    size_t skipped_from = 0;
+    out.size = 0;
+    for (size_t word = 0; word < size; word += sizeof(uint64_t)) {
+        if (memcmp(first.bytes.data() + word, now.bytes.data() + word, sizeof(uint64_t)) == 0) {
+            continue;
+        }
+        for (size_t at = word; at < word + sizeof(uint64_t); at++) {
+            if (first.bytes[at] == now.bytes[at]) {
+                continue;
+            }
+            for (; at - skipped_from >= SKIP_MOST; skipped_from += SKIP_MOST) {
+                out.bytes[out.size++] = std::byte{SKIP_MOST};
+            }
+            out.bytes[out.size++] = static_cast<std::byte>(at - skipped_from);
+            out.bytes[out.size++] = now.bytes[at];
+            skipped_from = at + 1;
+        }
+    }
+}
+
+uint64_t hash_of(const std::byte *bytes, size_t size)
+{
+    uint64_t hash = size * 0x9e3779b97f4a7c15U;
+    for (size_t at = 0; at < size; at += sizeof hash) {
+        uint64_t word = 0;
+        memcpy(&word, bytes + at, std::min(sizeof word, size - at));
+        const auto product = static_cast<unsigned __int128>(word ^ hash) * 0xd6e8feb86659fd93U;
+        hash = static_cast<uint64_t>(product) ^ static_cast<uint64_t>(product >> 64) ^ 0xa0761d6478bd642fU;
+    }
+    return hash ^ hash >> 29;
+}
+
+state_head head_at(const state_store &store, state_place place)
+{
+    state_head head;
+    memcpy(&head, store.memory + place, sizeof head);
+    return head;
+}
+
+const std::byte *difference_at(const state_store &store, state_place place)
+{
+    return store.memory + place + sizeof(state_head);
+}
+
+// The slot of the difference, or the free one where it belongs.
+uint64_t &slot_of(state_store &store, const std::byte *bytes, size_t size, uint64_t hash)
+{
+    const size_t mask = store.table.size() - 1;
+    for (size_t at = hash >> TAG_BITS & mask;; at = (at + 1) & mask) {
+        uint64_t &slot = store.table[at];
+        if (slot == 0) {
+            return slot;
+        }
+        if ((slot & TAG_MASK) == (hash & TAG_MASK)) {
+            const state_place place = (slot >> TAG_BITS) - 1;
+            if (head_at(store, place).size == size && memcmp(difference_at(store, place), bytes, size) == 0) {
+                return slot;
+            }
+        }
+    }
+}
+
+void grow_table(state_store &store)
+{
+    store.table.assign(store.table.size() * 2, 0);
+    const size_t mask = store.table.size() - 1;
+    for (state_place place = 0; place < store.used; place = next_state(store, place)) {
+        const uint64_t hash = hash_of(difference_at(store, place), head_at(store, place).size);
+        size_t at = hash >> TAG_BITS & mask;
+        while (store.table[at] != 0) {
+            at = (at + 1) & mask;
+        }
+        store.table[at] = (place + 1) << TAG_BITS | (hash & TAG_MASK);
+    }
+}
+
+void take_difference(state_store &store, difference &out)
+{
+    static snapshot now;
+    take_snapshot(now);
+    if (store.states == 0) {
+        store.first = now;
+    }
+    compare(store.first, now, snapshot_size(), out);
+}
+
+void append(state_store &store, state_place parent, size_t stimulus, const difference &state)
+{
+    state_head head = {.size = static_cast<uint16_t>(state.size),
+                       .stimulus = static_cast<uint8_t>(stimulus),
+                       .marked = 0,
+                       .parent = {}};
+    const uint64_t from = parent + 1; // NO_STATE becomes 0
+    memcpy(head.parent, &from, sizeof head.parent);
+    memcpy(store.memory + store.used, &head, sizeof head);
+    memcpy(store.memory + store.used + sizeof head, state.bytes.data(), state.size);
+    store.used += sizeof head + state.size;
+    store.states++;
+}
+} // namespace
+
+void open_store(state_store &store)
+{
+    void *memory = mmap(nullptr, RESERVED, PROT_READ | PROT_WRITE, MAP_PRIVATE | MAP_ANONYMOUS | MAP_NORESERVE, -1, 0);
+    if (memory == MAP_FAILED) {
+        perror("kiv_led_explore: no address space for the states");
+        abort();
+    }
+    store.memory = static_cast<std::byte *>(memory);
+    store.used = 0;
+    store.states = 0;
+    store.table.assign(FIRST_TABLE, 0);
+}
+
+void close_store(state_store &store)
+{
+    munmap(store.memory, RESERVED);
+    store.memory = nullptr;
+    store.table = {};
+}
+
+found_state add_state(state_store &store, state_place parent, size_t stimulus)
+{
+    static difference state;
+    take_difference(store, state);
+    const uint64_t hash = hash_of(state.bytes.data(), state.size);
+    uint64_t &slot = slot_of(store, state.bytes.data(), state.size, hash);
+    if (slot != 0) {
+        return {(slot >> TAG_BITS) - 1, false};
+    }
+    const state_place place = store.used;
+    slot = (place + 1) << TAG_BITS | (hash & TAG_MASK);
+    append(store, parent, stimulus, state);
+    if (store.states * 2 > store.table.size()) {
+        grow_table(store);
+    }
+    return {place, true};
+}
+
+state_place find_state(state_store &store)
+{
+    static difference state;
+    take_difference(store, state);
+    const uint64_t hash = hash_of(state.bytes.data(), state.size);
+    const uint64_t slot = slot_of(store, state.bytes.data(), state.size, hash);
+    return slot == 0 ? NO_STATE : (slot >> TAG_BITS) - 1;
+}
+
+void read_state(const state_store &store, state_place place, snapshot &into)
+{
+    const std::byte *bytes = difference_at(store, place);
+    const std::byte *end = bytes + head_at(store, place).size;
+    size_t at = 0;
+    memcpy(into.bytes.data(), store.first.bytes.data(), snapshot_size());
+    while (bytes < end) {
+        const size_t skip = std::to_integer<size_t>(*bytes++);
+        at += skip;
+        if (skip < SKIP_MOST) {
+            into.bytes[at++] = *bytes++;
+        }
+    }
+}
+
+state_place next_state(const state_store &store, state_place place)
+{
+    return place + sizeof(state_head) + head_at(store, place).size;
+}
+
+state_place parent_of(const state_store &store, state_place place)
+{
+    uint64_t from = 0;
+    const state_head head = head_at(store, place);
+    memcpy(&from, head.parent, sizeof head.parent);
+    return from - 1; // 0 becomes NO_STATE
+}
+
+size_t stimulus_into(const state_store &store, state_place place)
+{
+    return head_at(store, place).stimulus;
+}
+
+bool is_marked(const state_store &store, state_place place)
+{
+    return head_at(store, place).marked != 0;
+}
+
+void mark(state_store &store, state_place place)
+{
+    store.memory[place + offsetof(state_head, marked)] = std::byte{1};
+}
