@@ -164,16 +164,19 @@ std::string register_statement(const message_head &head)
 
 std::string scenario_word(const std::string &text)
 {
-    if (!text.empty() && text.find_first_not_of(PLAIN) == std::string::npos) {
-        return text;
-    }
-    std::string quoted = "\"";
+    const bool plain = !text.empty() && text.find_first_not_of(PLAIN) == std::string::npos;
+    return plain ? text : quoted(text);
+}
+
+std::string quoted(const std::string &text)
+{
+    std::string words = "\"";
     for (const char c : text) {
         const auto byte = static_cast<unsigned char>(c);
         const bool printable = byte >= 0x20 && byte < 0x7f && c != '"' && c != '\\';
-        quoted += printable ? std::string(1, c) : "\\x" + hex(std::string(1, c));
+        words += printable ? std::string(1, c) : "\\x" + hex(std::string(1, c));
     }
-    return quoted + "\"";
+    return words + "\"";
 }
 
 std::string shortened(const std::string &text)

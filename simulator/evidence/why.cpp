@@ -1,6 +1,7 @@
 #include "evidence/why.h"
 
 #include "evidence/drops.h"
+#include "evidence/from_log.h"
 #include "evidence/statements.h"
 
 #include <algorithm>
@@ -31,7 +32,8 @@ std::string look_text(const history &told, const led_look &look)
     if (!told.from_log) {
         return describe(look);
     }
-    return look.mode == led_mode::OFF ? "off" : look.mode == led_mode::ON ? "on" : "blink";
+    const std::string dimmed = look.brightness == 1 ? ", dimmed" : "";
+    return look.mode == led_mode::OFF ? "off" : (look.mode == led_mode::ON ? "on" : "blink") + dimmed;
 }
 
 std::string group_of(int led)
@@ -203,6 +205,13 @@ size_t origin_of(const std::vector<led_change> &changes, size_t last)
     return last;
 }
 
+void explain_untold(std::string &answer, const history &told, const led_change *change)
+{
+    if (told.from_log) {
+        put_all(answer, "not in the log", untold_by_log(told, change));
+    }
+}
+
 void explain_last_asked(std::string &answer, const history &told, const led_change &last, int led)
 {
     if (last.failed) {
@@ -224,6 +233,7 @@ std::string why(const history &told, int led, size_t until)
         answer = name + " is dark: nobody has asked for it since the " + (told.from_log ? "log" : "trace") +
                  " begins, at " + when(told, 0) + "\n";
         explain_drops(answer, told, led, 0, until);
+        explain_untold(answer, told, nullptr);
         return answer;
     }
     const led_change &last = changes[count - 1];
@@ -242,6 +252,7 @@ std::string why(const history &told, int led, size_t until)
     if (dark) {
         explain_drops(answer, told, led, origin.request, until);
     }
+    explain_untold(answer, told, &origin);
     return answer;
 }
 
@@ -254,7 +265,7 @@ std::string why_always(const history &told, int led)
             continue;
         }
         std::string row = when(told, change.request) + "  " + look;
-        row.resize(std::max<size_t>(row.size() + 1, 30), ' ');
+        row.resize(std::max<size_t>(row.size() + 1, told.from_log ? 44 : 30), ' ');
         answer += row + describe(told, change.in) + "\n";
     }
     return answer.empty() ? std::string(led_name(led)) + " never changes\n" : answer;

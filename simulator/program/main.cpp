@@ -129,9 +129,10 @@ int main(int argc, char **argv)
     show->add_flag("--all-requests", evidence.all_requests, "Show every LED request, not only what it changes");
 
     CLI::App *why = app.add_subcommand("why", "Say why an LED shows what it shows");
-    why->add_option("TRACE", evidence.file, "What run --trace or a recording left")->required();
+    why->add_option("TRACE", evidence.file, "What run --trace or a recording left, or a log")->required();
     why->add_option("LED", evidence.led, "Its name, such as bat_green")->required();
-    why->add_option("--at", evidence.at_s, "At this second of the trace; otherwise at its end");
+    why->add_option("--at", evidence.at_s, "At this second of the trace or line of the log; otherwise at its end");
+    why->add_flag("--log", evidence.from_log, "The file is a plain log of a device");
     why->add_flag("--all", evidence.always, "Every change of the LED with its cause");
 
     CLI::App *story = app.add_subcommand("story", "Tell a trace as a scenario");

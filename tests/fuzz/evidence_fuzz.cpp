@@ -1,4 +1,5 @@
-// Everything that reads a trace, over any text.
+// Everything that reads a trace or a log, over any text.
+#include "evidence/from_log.h"
 #include "evidence/show.h"
 #include "evidence/story.h"
 #include "evidence/why.h"
@@ -17,22 +18,29 @@ int LLVMFuzzerInitialize(int *, char ***)
     return nowhere == nullptr ? 1 : 0;
 }
 
+static void explain(const history &told)
+{
+    for (const led_row &led : led_rows) {
+        if (why(told, led.led_id, told.trace->entries.size()).empty() || why_always(told, led.led_id).empty()) {
+            std::abort();
+        }
+    }
+}
+
 int LLVMFuzzerTestOneInput(const uint8_t *data, size_t size)
 {
     const std::string text(reinterpret_cast<const char *>(data), size);
     recording trace;
+    log_history log;
     std::string error;
+    if (parse_log(text, "input", log, error)) {
+        explain(log.told);
+    }
     if (!parse_recording(text, "input", trace, error)) {
         return error.starts_with("input:") ? 0 : (std::abort(), 1);
     }
     show_recording(trace, {}, nowhere);
     story_of(trace);
-    const history told = history_of(trace);
-    for (int led = 0; led < LED_ID_COUNT; led++) {
-        if (!led_name(led).empty() && why(told, led, trace.entries.size()).empty()) {
-            std::abort();
-        }
-        why_always(told, led);
-    }
+    explain(history_of(trace));
     return 0;
 }
