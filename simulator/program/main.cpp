@@ -1,5 +1,6 @@
 // kiv_led_sim: plays scenarios against the daemon on a PC.
 #include "evidence/commands.h"
+#include "language/doubts.h"
 #include "language/names.h"
 #include "language/words.h"
 #include "live/commands.h"
@@ -7,6 +8,7 @@
 #include "panel/panel.h"
 #include "panel/table_picture.h"
 #include "program/run.h"
+#include "reference.h"
 #include "stories.h"
 #include "table.h"
 
@@ -55,6 +57,19 @@ int table(const std::string &name, daemon_options options, bool as_svg)
     return 0;
 }
 
+int words_of(const std::string &name, daemon_options options)
+{
+    const product_name *product = find_product(name);
+    std::string error;
+    if (!product && !name.empty()) {
+        error = "unknown product '" + name + "'; products are " + product_names();
+    } else if (find_daemon(options, error)) {
+        return print_reference(product, options);
+    }
+    fprintf(stderr, "%s\n", error.c_str());
+    return EXIT_UNREADABLE;
+}
+
 int check(const std::vector<std::string> &paths)
 {
     std::vector<std::string> files;
@@ -65,6 +80,10 @@ int check(const std::vector<std::string> &paths)
         if (!load_story(path, story, error)) {
             fputs(error.c_str(), stderr);
             worst = EXIT_UNREADABLE;
+            continue;
+        }
+        for (const std::string &doubt : find_doubts(story)) {
+            fprintf(stderr, "%s\n", doubt.c_str());
         }
     }
     return worst;
@@ -104,6 +123,10 @@ int main(int argc, char **argv)
     CLI::App *table_command = app.add_subcommand("table", "Show what the LEDs of a product show in each state");
     table_command->add_option("PRODUCT", product, "One of " + product_names())->required();
     table_command->add_flag("--svg", as_svg, "As a picture, for a user's manual");
+
+    CLI::App *words_command =
+        app.add_subcommand("words", "List the words of scenarios, and what the daemon makes of them");
+    words_command->add_option("PRODUCT", product, "Only what this one hears and reads: " + product_names());
 
     live_options live;
     CLI::App *live_app = app.add_subcommand("live", "Talk to a daemon on the wall clock");
@@ -160,7 +183,7 @@ int main(int argc, char **argv)
     CLI::App *watch = app.add_subcommand("watch", "Show the LEDs and the log of a daemon that runs");
     watch->add_option("--device", live.device, "Its device directory")->required();
 
-    for (CLI::App *command : {run_command, table_command, panel_command, live_app}) {
+    for (CLI::App *command : {run_command, table_command, words_command, panel_command, live_app}) {
         command->add_option("--daemon", options.daemon.daemon, "The daemon's program");
         command->add_option("--emulator", options.daemon.emulator, "A command that runs the daemon's program");
     }
@@ -175,6 +198,9 @@ int main(int argc, char **argv)
     }
     if (*table_command) {
         return table(product, options.daemon, as_svg);
+    }
+    if (*words_command) {
+        return words_of(product, options.daemon);
     }
     if (*panel_command) {
         panel.process = options.daemon;

@@ -1,10 +1,14 @@
 // The program as a whole, with the daemon itself.
+#include "language/vocabulary.h"
+#include "seen/trace.h"
 #include "world/device.h"
 
+#include <algorithm>
 #include <cstdio>
 #include <filesystem>
 #include <fstream>
 #include <gtest/gtest.h>
+#include <sstream>
 #include <sys/wait.h>
 
 namespace fs = std::filesystem;
@@ -225,4 +229,36 @@ TEST_F(Play, GoesOnTheWallClock)
         play(POWERED + "notify SMS NEW_SMS\nafter 200ms\nexpect sms_blue blink 800/1200 4\n", "--real-time");
     EXPECT_EQ(result.code, 0) << result.printed;
     EXPECT_EQ(play(POWERED + "clock 22:00\n", "--real-time").code, 2);
+}
+
+// The vocabulary is written by hand; that it is the daemon's own is seen here.
+TEST_F(Play, KnowsTheDaemonsWords)
+{
+    std::string text = POWERED;
+    const std::string classes = "2G3G4G5G";
+    for (const network_word &word : network_words()) {
+        const size_t shown_as = classes.find(word.shown_as) / 2 + 2;
+        text += "nv network_type=" + std::string(word.name) + "\nnotify NWINFO NETTYPE\n" +
+                "expect log \"enter kiv_led_handle_nwinfoStatus : " + std::to_string(shown_as) + "\"\n";
+    }
+    EXPECT_EQ(play(text).code, 0);
+
+    std::ostringstream program;
+    program << std::ifstream(DAEMON, std::ios::binary).rdbuf();
+    for (const nv_word &word : nv_words()) {
+        EXPECT_NE(program.str().find(word.key), std::string::npos) << word.key;
+    }
+    for (const auto &trace : fs::directory_iterator(RECORDINGS)) {
+        std::ifstream lines(trace.path());
+        for (std::string line; std::getline(lines, line);) {
+            const std::optional<trace_entry> entry = parse_trace_line(line);
+            if (entry && entry->call == "kiv_syslog_append") {
+                const std::string source = quoted_texts(entry->arguments).at(0);
+                EXPECT_NE(std::ranges::find(log_sources(), source), log_sources().end()) << source;
+            } else if (entry && entry->call == "kiv_nvconfig_read") {
+                const std::string key = quoted_texts(entry->arguments).at(0);
+                EXPECT_NE(std::ranges::find(nv_words(), key, &nv_word::key), nv_words().end()) << key;
+            }
+        }
+    }
 }
