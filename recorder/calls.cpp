@@ -13,9 +13,6 @@ namespace
 {
 enum { LOG_LINE_MAX = 4096 };
 
-void no_arguments(trace_line &) {}
-void nothing(const answer &) {}
-
 int simple_call(const char *call, const void *caller, auto arguments, auto work)
 {
     return front_call(call, caller, arguments, work, trace_result, nothing);
@@ -36,8 +33,6 @@ int query(const char *call, const void *caller, bsp_query_result *result, auto r
         [&](const answer &told) { put_query(told, result); });
 }
 } // namespace
-
-#define CALLER __builtin_return_address(0)
 
 extern "C" {
 
@@ -153,7 +148,7 @@ int kiv_bsp_set_leds_sync(led_request request, int *result)
         [&](const answer &told) {
             returned = told.result == 0 ? 0 : -1;
             if (result) {
-                *result = told.result;
+                *result = static_cast<int>(told.result);
             }
         });
     return returned;
@@ -210,7 +205,7 @@ int kiv_timer(timer_callback callback, void *argument, int period_ms, int repeat
     return front_call(
         __func__, CALLER, [&](trace_line &line) { trace_timer(line, period_ms, repeat); },
         [&] { return start_timer(callback, argument, period_ms, repeat); }, trace_result,
-        [&](const answer &told) { keep_timer(told.result, callback, argument); });
+        [&](const answer &told) { keep_timer(static_cast<int>(told.result), callback, argument); });
 }
 
 int kiv_delete_timer(int handle)
