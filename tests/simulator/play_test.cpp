@@ -5,11 +5,14 @@
 
 #include <algorithm>
 #include <cstdio>
+#include <fcntl.h>
 #include <filesystem>
 #include <fstream>
 #include <gtest/gtest.h>
 #include <sstream>
+#include <sys/stat.h>
 #include <sys/wait.h>
+#include <unistd.h>
 
 namespace fs = std::filesystem;
 
@@ -151,6 +154,14 @@ TEST_F(Play, WritesOverNothingButATrace)
     read_file(place + "/a.scn", text);
     EXPECT_EQ(text, story);
     EXPECT_EQ(play(story, "--trace .").code, 2);
+    ASSERT_EQ(mkfifo((place + "/pipe").c_str(), 0600), 0);
+    EXPECT_EQ(play(story, "--trace pipe").code, 2);
+    const int reader = open((place + "/pipe").c_str(), O_RDWR | O_NONBLOCK);
+    EXPECT_EQ(play(story, "--junit pipe").code, 0);
+    text.assign(4096, '\0');
+    EXPECT_GT(read(reader, text.data(), text.size()), 0);
+    EXPECT_NE(text.find("tests=\"1\" failures=\"0\""), std::string::npos) << text;
+    close(reader);
     EXPECT_EQ(play(story, "--trace t").code, 0);
     EXPECT_EQ(play(story, "--trace t").code, 0);
 }
