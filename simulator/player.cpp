@@ -179,8 +179,8 @@ bool check(player &p, const statement &s)
             p.held++;
             return true;
         }
-        if (left > 1) {
-            pass_time(r, r.now_ns + 50 * NS_PER_MS, error);
+        if (left > 1 && !pass_time(r, r.now_ns + 50 * NS_PER_MS, error)) {
+            return failed(p, s, "the daemon comes to rest", error);
         }
     }
     return failed(p, s, s.text.substr(s.text.find(' ') + 1), shown);

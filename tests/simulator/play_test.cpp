@@ -166,6 +166,17 @@ TEST_F(Play, WritesOverNothingButATrace)
     EXPECT_EQ(play(story, "--trace t").code, 0);
 }
 
+TEST_F(Play, TakesNoEndForAnExpectedOneWhenTheTraceIsLost)
+{
+    std::ofstream(place + "/daemon") << "#!/bin/sh\nexit 74\n";
+    fs::permissions(place + "/daemon", fs::perms::owner_all);
+    for (const std::string options : {"", "--real-time "}) {
+        const outcome result = play("product UFI\nlaunch\nexpect ended\n", options + "--daemon ./daemon");
+        EXPECT_EQ(result.code, 2) << options << result.printed;
+        EXPECT_NE(result.printed.find("its trace could not be written\n"), std::string::npos) << result.printed;
+    }
+}
+
 TEST_F(Play, TellsACiSystemWhatFailed)
 {
     std::ofstream(place + "/good.scn") << POWERED + "expect bat_green on 4\n";
