@@ -57,14 +57,22 @@ struct awaited {
     std::string behind_off;   // made only behind this group's going off
 };
 
+// As far as its lines have told it.
+struct told_message {
+    size_t entry = SIZE_MAX;
+    long source = 0;
+    long cmd = 0;
+    long event = 0;
+    std::optional<std::string> text = {};
+};
+
 struct reading {
     recording &calls;
     std::vector<std::string> &moments; // by entry
     const log_line *line = nullptr;
     std::string before; // the line before
     awaited next;
-    size_t message = SIZE_MAX; // the entry of the last one
-    long source = 0;           // of it
+    told_message message; // the last one
 };
 
 bool holds(const std::string &text, std::string_view piece)
@@ -110,62 +118,45 @@ void put_requests(reading &in, const std::string &requests)
 
 void begin_message(reading &in)
 {
-    in.message = in.calls.entries.size();
+    in.message = {.entry = in.calls.entries.size()};
     put(in, "kiv_recv_msg", "");
 }
 
-// The message as the trace would tell it, as far as its lines have told it.
-void tell_message(reading &in, long cmd, const std::string &behind_head, size_t data_size)
+// As the trace tells it. Of a command the log has no more than the number; the daemon's own has no more.
+void tell_message(reading &in)
 {
-    if (in.message == SIZE_MAX) {
-        begin_message(in);
+    const auto &[entry, source, cmd, event, text] = in.message;
+    const bool own = cmd == KIV_MSG_CMD_LED_RELIGHT_MSG && source == KIV_MODULE_LED;
+    const size_t size = own ? 0 : sizeof(uint32_t) + (text ? text->size() + 1 : 0);
+    const long sender = own || cmd == MSG_CMD_SERVICE_NOTIFY ? source : long{KIV_MODULE_MAIN};
+    std::ostringstream told;
+    told << 12 + size << ", cmd " << cmd << " dest 38 source " << sender << " len " << size;
+    if (!own) {
+        told << " event 0x" << std::hex << static_cast<uint32_t>(event) << " " << quoted(text.value_or(""));
     }
-    in.calls.entries[in.message].result = std::to_string(12 + data_size) + ", cmd " + std::to_string(cmd) +
-                                          " dest 38 source " + std::to_string(in.source) + " len " +
-                                          std::to_string(data_size) + behind_head;
-}
-
-// Of a command the log tells the number only, unless it is the daemon's own.
-void tell_command(reading &in, long cmd)
-{
-    const bool own = cmd == KIV_MSG_CMD_LED_RELIGHT_MSG && in.source == KIV_MODULE_LED;
-    in.source = own ? KIV_MODULE_LED : KIV_MODULE_MAIN;
-    tell_message(in, cmd, own ? "" : " event 0x0 \"\"", own ? 0 : sizeof(uint32_t));
-}
-
-void tell_event(reading &in, long source, long event)
-{
-    char mask[32];
-    snprintf(mask, sizeof mask, " event 0x%x \"\"", static_cast<unsigned>(event));
-    in.source = source;
-    tell_message(in, MSG_CMD_SERVICE_NOTIFY, mask, sizeof(uint32_t));
-}
-
-// Takes the place of the empty text in what the message's earlier line has told.
-void tell_payload(reading &in, const std::string &text)
-{
-    const std::optional<std::string> event =
-        in.message == SIZE_MAX ? std::nullopt : behind(in.calls.entries[in.message].result, " event ");
-    if (event) {
-        const std::string mask = " event " + event->substr(0, event->find(' ') + 1);
-        tell_message(in, MSG_CMD_SERVICE_NOTIFY, mask + quoted(text), sizeof(uint32_t) + text.size() + 1);
-    }
+    in.calls.entries[entry].result = told.str();
 }
 
 void take_message(reading &in, const std::string &text)
 {
-    if (holds(text, "enter messageParse fun")) {
+    const std::optional<long> cmd = number_behind(text, "recv_msg.us_cmd is ");
+    const std::optional<long> event = number_behind(text, "regDecodeMsg source_id ");
+    const std::optional<std::string> flag = behind(text, "recv REG_WMS_SMS_VOCEMAIL_SET_FLAG: ");
+    const std::optional<std::string> data = holds(text, "_UNREAD_SMS") ? flag : behind(text, "p_data=");
+    if (holds(text, "enter messageParse fun") || ((cmd || event) && in.message.entry == SIZE_MAX)) {
         begin_message(in);
-    } else if (const auto source = number_behind(text, "recv_msg.us_source_module_id is ")) {
-        in.source = *source;
-    } else if (const auto cmd = number_behind(text, "recv_msg.us_cmd is ")) {
-        tell_command(in, *cmd);
-    } else if (const auto module_id = number_behind(text, "regDecodeMsg source_id ")) {
-        tell_event(in, *module_id, number_behind(text, "mask1 ").value_or(0));
-    } else if (const auto flag = behind(text, "recv REG_WMS_SMS_VOCEMAIL_SET_FLAG: ")) {
-        tell_payload(in, *flag);
-    } else if (const auto data = behind(text, "p_data="); data && !holds(text, "_UNREAD_SMS")) {
-        tell_payload(in, *data);
+    }
+    in.message.source = number_behind(text, "source_module_id is ").value_or(event.value_or(in.message.source));
+    if (cmd) {
+        in.message.cmd = *cmd;
+    } else if (event) {
+        in.message.cmd = MSG_CMD_SERVICE_NOTIFY;
+        in.message.event = number_behind(text, "mask1 ").value_or(0);
+    } else if (flag || data) {
+        in.message.text = flag ? flag : data;
+    }
+    if ((cmd || event || in.message.text) && in.message.cmd != 0) {
+        tell_message(in);
     }
 }
 
@@ -188,7 +179,7 @@ void take_cause(reading &in, const std::string &text)
     take_timer(in, text);
     if (holds(text, "kiv_mirta_led start!")) {
         put(in, "kiv_trace", "");
-        in.message = SIZE_MAX;
+        in.message = {};
     } else if (const auto event = number_behind(text, "kiv_led_bspIpcCallBack : event id = ")) {
         put(in, "kiv_bsp_ind", std::to_string(*event));
     }
@@ -312,7 +303,7 @@ bool parse_log(std::string_view text, const std::string &name, log_history &out,
     const std::vector<log_line> log = own_lines(text);
     out.calls = std::make_unique<recording>();
     std::vector<std::string> moments;
-    reading in = {.calls = *out.calls, .moments = moments, .before = {}, .next = {}};
+    reading in = {.calls = *out.calls, .moments = moments, .before = {}, .next = {}, .message = {}};
     for (const log_line &line : log) {
         take_line(in, line);
     }
