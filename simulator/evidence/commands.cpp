@@ -2,7 +2,6 @@
 
 #include "evidence/from_log.h"
 #include "evidence/replay.h"
-#include "evidence/show.h"
 #include "evidence/story.h"
 #include "evidence/why.h"
 #include "language/names.h"
@@ -21,14 +20,14 @@ int refuse(const std::string &what)
 }
 } // namespace
 
-int show_command(const evidence_options &options)
+int show_command(const evidence_options &options, std::vector<shown_step> &steps)
 {
     recording trace;
     std::string error;
     if (!load_recording(options.file, trace, error)) {
         return refuse(error);
     }
-    show_recording(trace, {.every_request = options.all_requests}, stdout);
+    steps = show_recording(trace, {.every_request = options.all_requests}, stdout);
     return 0;
 }
 

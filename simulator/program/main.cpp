@@ -6,6 +6,7 @@
 #include "live/commands.h"
 #include "live/watch.h"
 #include "panel/panel.h"
+#include "panel/sketch.h"
 #include "panel/table_picture.h"
 #include "program/run.h"
 #include "reference.h"
@@ -51,6 +52,20 @@ int table(const std::string &name, daemon_options options, bool as_svg)
         }
     }
     if (!error.empty()) {
+        fprintf(stderr, "%s\n", error.c_str());
+        return EXIT_UNREADABLE;
+    }
+    return 0;
+}
+
+int show_trace(const evidence_options &options, const std::string &picture_path)
+{
+    std::vector<shown_step> steps;
+    std::string error;
+    if (const int result = show_command(options, steps)) {
+        return result;
+    }
+    if (!picture_path.empty() && !write_file(picture_path, draw_run(picture_of(steps, options.file)), error)) {
         fprintf(stderr, "%s\n", error.c_str());
         return EXIT_UNREADABLE;
     }
@@ -150,6 +165,7 @@ int main(int argc, char **argv)
     CLI::App *show = app.add_subcommand("show", "Show a trace as a timeline");
     show->add_option("TRACE", evidence.file, "What run --trace or a recording left")->required();
     show->add_flag("--all-requests", evidence.all_requests, "Show every LED request, not only what it changes");
+    show->add_option("--picture", options.picture_path, "Draw the trace into this SVG file");
 
     CLI::App *why = app.add_subcommand("why", "Say why an LED shows what it shows");
     why->add_option("TRACE", evidence.file, "What run --trace or a recording left, or a log")->required();
@@ -207,7 +223,7 @@ int main(int argc, char **argv)
         return run_panel(panel);
     }
     if (*show) {
-        return show_command(evidence);
+        return show_trace(evidence, options.picture_path);
     }
     if (*story) {
         return story_command(evidence);
