@@ -173,25 +173,15 @@ int kiv_bsp_get_sensor_temp_sync(int sensor_id, bsp_sensor_temp *temp)
         [&](const answer &told) { put_temperature(told, temp); });
 }
 
-int kiv_bsp_register_battery_online_ind(bsp_ind_callback callback)
-{
-    return register_ind(__func__, CALLER, BATTERY_ONLINE, callback, next().kiv_bsp_register_battery_online_ind);
-}
-
-int kiv_bsp_register_battery_offline_ind(bsp_ind_callback callback)
-{
-    return register_ind(__func__, CALLER, BATTERY_OFFLINE, callback, next().kiv_bsp_register_battery_offline_ind);
-}
-
-int kiv_bsp_register_charger_connect_ind(bsp_ind_callback callback)
-{
-    return register_ind(__func__, CALLER, CHARGER_CONNECT, callback, next().kiv_bsp_register_charger_connect_ind);
-}
-
-int kiv_bsp_register_charger_disconnect_ind(bsp_ind_callback callback)
-{
-    return register_ind(__func__, CALLER, CHARGER_DISCONNECT, callback, next().kiv_bsp_register_charger_disconnect_ind);
-}
+#define REGISTER_IND(name, slot)                                                                                       \
+    int name(bsp_ind_callback callback)                                                                                \
+    {                                                                                                                  \
+        return register_ind(__func__, CALLER, slot, callback, next().name);                                            \
+    }
+REGISTER_IND(kiv_bsp_register_battery_online_ind, BATTERY_ONLINE)
+REGISTER_IND(kiv_bsp_register_battery_offline_ind, BATTERY_OFFLINE)
+REGISTER_IND(kiv_bsp_register_charger_connect_ind, CHARGER_CONNECT)
+REGISTER_IND(kiv_bsp_register_charger_disconnect_ind, CHARGER_DISCONNECT)
 
 int kiv_ipc_init(int log_id, int flag)
 {

@@ -106,19 +106,15 @@ void put(const trace_line &line)
     give_up("the recording ends", failure);
 }
 
-[[gnu::noinline]] void put_start()
+[[gnu::noinline]] void put_head(bool goes_on)
 {
     trace_line line;
-    trace_begin(line, "kiv_trace");
-    trace_start(line);
-    put(line);
-}
-
-[[gnu::noinline]] void put_goes_on()
-{
-    trace_line line;
-    trace_begin(line, "kiv_trace_goes_on");
-    trace_goes_on(line, product.data());
+    trace_begin(line, goes_on ? "kiv_trace_goes_on" : "kiv_trace");
+    if (goes_on) {
+        trace_goes_on(line, product.data());
+    } else {
+        trace_start(line);
+    }
     put(line);
 }
 
@@ -133,7 +129,7 @@ void change_files()
     }
     file = fresh;
     next().close(old);
-    put_goes_on();
+    put_head(true);
 }
 
 size_t parse_size(const char *text)
@@ -175,7 +171,7 @@ __attribute__((constructor)) void begin_recording()
     unsetenv("KIV_RECORD_MAX");
     file = fd;
     if (fd >= 0) {
-        put_start();
+        put_head(false);
     }
 }
 } // namespace

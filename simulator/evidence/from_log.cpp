@@ -155,7 +155,7 @@ void take_message(reading &in, const std::string &text)
     } else if (flag || data) {
         in.message.text = flag ? flag : data;
     }
-    if ((cmd || event || in.message.text) && in.message.cmd != 0) {
+    if ((cmd || event || flag || data) && in.message.cmd != 0) {
         tell_message(in);
     }
 }

@@ -1,6 +1,7 @@
 #include "evidence/replay.h"
 
 #include "evidence/replay_protocol.h"
+#include "world/device.h"
 
 #include <array>
 #include <cerrno>
@@ -90,10 +91,10 @@ bool set_up_stage(stage &s, std::string &report)
 {
     std::error_code failure;
     s.preload = find_library(s.options.process.daemon);
-    s.folder = (fs::temp_directory_path(failure) / "kiv_replay_XXXXXX").string();
-    if (s.preload.empty() || !mkdtemp(s.folder.data())) {
-        report += s.preload.empty() ? std::string(REPLAY_FILE) + " is neither in lib/ nor in ../lib/kiv_led\n"
-                                    : s.folder + ": " + strerror(errno) + "\n";
+    std::string error = std::string(REPLAY_FILE) + " is neither in lib/ nor in ../lib/kiv_led";
+    s.folder = s.preload.empty() ? "" : make_device(error);
+    if (s.folder.empty()) {
+        report += error + "\n";
         return false;
     }
     for (const char *name : DEVICE_LIBRARIES) {
@@ -112,11 +113,10 @@ bool set_up_stage(stage &s, std::string &report)
 
 void take_down_stage(stage &s)
 {
-    std::error_code failure;
     if (s.page) {
         munmap(s.page, sizeof *s.page);
     }
-    fs::remove_all(s.folder, failure);
+    remove_device(s.folder);
 }
 
 void give_orders(const stage &s, size_t from, size_t to)
