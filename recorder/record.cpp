@@ -177,7 +177,7 @@ __attribute__((constructor)) void begin_recording()
 } // namespace
 
 // Never built with a sanitizer, as the C library's front calls it.
-[[gnu::no_sanitize("thread")]] bool takes_call(const void *caller)
+__attribute__((no_sanitize("thread"))) bool takes_call(const void *caller)
 {
     return file.load() >= 0 && depth == 0 && is_daemon(caller);
 }
