@@ -6,12 +6,14 @@
 #include "evidence/why.h"
 #include "language/names.h"
 
+#include <algorithm>
 #include <cstdio>
 #include <filesystem>
 
 namespace
 {
 constexpr int EXIT_UNREADABLE = 2;
+constexpr double LONGEST_S = 1e12;
 
 int refuse(const std::string &what)
 {
@@ -55,8 +57,8 @@ int why_command(const evidence_options &options)
         return refuse(error);
     }
     const history told = options.from_log ? std::move(log.told) : history_of(trace);
-    const size_t until = options.at_s < 0 ? told.trace->entries.size()
-                                          : entry_after(*told.trace, static_cast<int64_t>(options.at_s * 1'000'000));
+    const auto at_us = static_cast<int64_t>(std::min(options.at_s, LONGEST_S) * 1'000'000);
+    const size_t until = options.at_s < 0 ? told.trace->entries.size() : entry_after(*told.trace, at_us);
     fputs((options.always ? why_always(told, *led) : why(told, *led, until)).c_str(), stdout);
     return 0;
 }

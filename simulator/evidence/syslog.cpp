@@ -97,9 +97,10 @@ std::vector<log_line> own_lines(std::string_view log)
         const size_t end = std::min(log.find('\n'), log.size());
         std::string_view line = log.substr(0, std::min(end, LINE_MAX_SIZE));
         std::string moment;
-        if (take_heads(line, moment)) {
+        const bool text = line.find('\0') == std::string_view::npos; // else a program, or what a power cut has left
+        if (text && take_heads(line, moment)) {
             named.push_back({number, moment, printable(line)});
-        } else if (named.empty() && !take(line, head_of_another())) {
+        } else if (text && named.empty() && !take(line, head_of_another())) {
             bare.push_back({number, moment, printable(line)});
         }
         log.remove_prefix(std::min(end + 1, log.size()));

@@ -123,6 +123,7 @@ TEST(Log, SaysWhenItWasKeptWithoutTheLinesThatTellRequests)
 TEST(Log, RefusesWhatHoldsNoLineOfTheDaemon)
 {
     for (const std::string &text : {std::string(), std::string("\n\n\n"), std::string(9000, '\0'),
+                                    std::string("\0enter kiv_led_set_net_led_off\n\0\0", 34),
                                     std::string("\x7f"
                                                 "ELF\x02\x01 kiv"),
                                     std::string("Nov 22 20:15:01 cpe init[1]: starting kiv_mirta_led: ok\n")}) {
