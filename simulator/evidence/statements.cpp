@@ -5,6 +5,7 @@
 #include "language/names.h"
 #include "language/words.h"
 
+#include <algorithm>
 #include <array>
 #include <cstdio>
 #include <cstring>
@@ -179,9 +180,18 @@ std::string quoted(const std::string &text)
     return words + "\"";
 }
 
+std::string printable(std::string_view text)
+{
+    std::string shown(text);
+    std::replace_if(
+        shown.begin(), shown.end(), [](char c) { return (c >= 0 && c < ' ') || c == 0x7f; }, '?');
+    return shown;
+}
+
 std::string shortened(const std::string &text)
 {
-    return text.size() <= SHORT_ENOUGH ? text : text.substr(0, SHORT_ENOUGH) + " ...";
+    const std::string shown = printable(text);
+    return shown.size() <= SHORT_ENOUGH ? shown : shown.substr(0, SHORT_ENOUGH) + " ...";
 }
 
 std::optional<std::string> received_message(const trace_entry &entry)

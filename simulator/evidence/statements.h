@@ -21,4 +21,5 @@ std::string scenario_word(const std::string &text);
 
 std::string quoted(const std::string &text); // always
 
-std::string shortened(const std::string &text); // to what fits on a line
+std::string printable(std::string_view text);   // without bytes that a terminal would act upon
+std::string shortened(const std::string &text); // printable, to what fits on a line

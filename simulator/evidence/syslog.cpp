@@ -1,5 +1,7 @@
 #include "evidence/syslog.h"
 
+#include "evidence/statements.h"
+
 #include <algorithm>
 #include <array>
 #include <regex>
@@ -55,13 +57,9 @@ bool take(std::string_view &line, const std::regex &pattern, std::string *taken 
     return true;
 }
 
-// Bytes that a terminal would act upon are not shown.
-std::string printable(std::string_view text)
+std::string without_end(std::string_view line)
 {
-    std::string shown(text.substr(0, text.find_last_not_of(" \r") + 1));
-    std::replace_if(
-        shown.begin(), shown.end(), [](char c) { return (c >= 0 && c < ' ') || c == 0x7f; }, '?');
-    return shown;
+    return printable(line.substr(0, line.find_last_not_of(" \r") + 1));
 }
 
 // True when the line names the daemon. It has a second head where its standard error went to a logger.
@@ -99,9 +97,9 @@ std::vector<log_line> own_lines(std::string_view log)
         std::string moment;
         const bool text = line.find('\0') == std::string_view::npos; // else a program, or what a power cut has left
         if (text && take_heads(line, moment)) {
-            named.push_back({number, moment, printable(line)});
+            named.push_back({number, moment, without_end(line)});
         } else if (text && named.empty() && !take(line, head_of_another())) {
-            bare.push_back({number, moment, printable(line)});
+            bare.push_back({number, moment, without_end(line)});
         }
         log.remove_prefix(std::min(end + 1, log.size()));
     }

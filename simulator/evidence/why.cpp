@@ -42,31 +42,6 @@ std::string group_of(int led)
     return std::string(name.substr(0, name.find('_')));
 }
 
-bool is_about_group(const trace_entry &entry, int led)
-{
-    const std::optional<led_wanted> request = led_request_of(entry);
-    return request && group_of(request->led) == group_of(led);
-}
-
-// The entries of the activity from behind the last request for another group's LED up to the request. What is read and
-// decided for an LED stands there.
-std::vector<size_t> way_to(const history &told, const led_change &change, int led)
-{
-    std::vector<size_t> way;
-    for (size_t at = change.request + 1; at-- > told.activities[change.in].entry;) {
-        const trace_entry &entry = told.trace->entries[at];
-        if (told.activity_of[at] != change.in) {
-            continue;
-        }
-        if (entry.call == "kiv_bsp_set_leds_sync" && !is_about_group(entry, led)) {
-            break;
-        }
-        way.push_back(at);
-    }
-    std::reverse(way.begin(), way.end());
-    return way;
-}
-
 // A scene decides once for all its LEDs.
 std::vector<size_t> all_before(const history &told, const led_change &change)
 {
@@ -76,6 +51,21 @@ std::vector<size_t> all_before(const history &told, const led_change &change)
             way.push_back(at);
         }
     }
+    return way;
+}
+
+// The entries of the activity from behind the last request for another group's LED up to the request. What is read and
+// decided for an LED stands there.
+std::vector<size_t> way_to(const history &told, const led_change &change, int led)
+{
+    std::vector<size_t> way = all_before(told, change);
+    const auto last = std::find_if(way.rbegin(), way.rend(), [&](size_t at) {
+        const trace_entry &entry = told.trace->entries[at];
+        const std::optional<led_wanted> request = led_request_of(entry);
+        return entry.call == "kiv_bsp_set_leds_sync" && !(request && group_of(request->led) == group_of(led));
+    });
+    way.erase(way.begin(), last.base());
+    way.push_back(change.request);
     return way;
 }
 
@@ -92,18 +82,6 @@ std::string value_read(const trace_entry &entry)
     return {};
 }
 
-lines values_on(const history &told, const std::vector<size_t> &way)
-{
-    lines values;
-    for (const size_t at : way) {
-        const std::string value = value_read(told.trace->entries[at]);
-        if (!value.empty() && std::find(values.begin(), values.end(), value) == values.end()) {
-            values.push_back(value);
-        }
-    }
-    return values;
-}
-
 // What every message and every request logs says nothing about this one.
 bool is_routine(const std::string &text)
 {
@@ -116,16 +94,23 @@ bool is_routine(const std::string &text)
            });
 }
 
-lines decisions_on(const history &told, const std::vector<size_t> &way)
+std::string decision(const trace_entry &entry)
 {
-    lines decisions;
+    const std::string text = log_text(entry);
+    return is_routine(text) ? "" : shortened(text);
+}
+
+// What the entries on the way tell, each thing once.
+lines told_on(const history &told, const std::vector<size_t> &way, std::string (*tell)(const trace_entry &))
+{
+    lines texts;
     for (const size_t at : way) {
-        const std::string text = log_text(told.trace->entries[at]);
-        if (!is_routine(text)) {
-            decisions.push_back(shortened(text));
+        const std::string text = tell(told.trace->entries[at]);
+        if (!text.empty() && std::find(texts.begin(), texts.end(), text) == texts.end()) {
+            texts.push_back(text);
         }
     }
-    return decisions;
+    return texts;
 }
 
 // Since when it is night, and who found that out.
@@ -159,10 +144,10 @@ void explain(std::string &answer, const history &told, const led_change &change,
 {
     const trace_entry &request = told.trace->entries[change.request];
     const std::vector<size_t> way = way_to(told, change, led);
-    const lines decisions = decisions_on(told, way);
+    const lines decisions = told_on(told, way, decision);
     put(answer, "set off by", describe(told, change.in));
-    put_all(answer, "read", values_on(told, way));
-    put_all(answer, "decided", decisions.empty() ? decisions_on(told, all_before(told, change)) : decisions);
+    put_all(answer, "read", told_on(told, way, value_read));
+    put_all(answer, "decided", decisions.empty() ? told_on(told, all_before(told, change), decision) : decisions);
     if (const std::optional<led_wanted> wanted = led_request_of(request); wanted && !told.from_log) {
         put(answer, "asked for", describe(wanted->look) + (change.failed ? "" : ", which the board did"));
     }
