@@ -329,17 +329,25 @@ bool load_log(const std::string &path, log_history &out, std::string &error)
 
 std::vector<std::string> untold_by_log(const history &told, const led_change *change)
 {
+    const std::vector<trace_entry> &entries = told.trace->entries;
+    const auto dropped = std::find_if(entries.rbegin(), entries.rend(),
+                                      [](const trace_entry &entry) { return log_text(entry) == DROPPED_LINES; });
+    std::vector<std::string> untold;
+    if (dropped != entries.rend()) {
+        const auto at = static_cast<size_t>(entries.rend() - dropped) - 1;
+        untold.push_back("what the logger has dropped, for the last time at " + when(told, at));
+    }
     if (!tells_requests(*told.trace)) {
-        return {"requests: it is kept without the daemon's lines of level 6, so all else here is a guess"};
-    }
-    if (!change) {
-        return {"what the LED showed before its first line, and what it may have lost"};
-    }
-    std::vector<std::string> untold = {"brightness and blink times, and each value read that no line repeats",
-                                       "threads: a line in between may be of something else"};
-    const activity &doing = told.activities[change->in];
-    if (doing.what == cause::TIMER && doing.asked_for == doing.entry) {
-        untold.emplace_back("who started the timer");
+        untold.emplace_back("requests: it is kept without the daemon's lines of level 6, so all else is a guess");
+    } else if (!change) {
+        untold.emplace_back("what the LED showed before its first line, and what it may have lost");
+    } else {
+        untold.emplace_back("brightness and blink times, and each value read that no line repeats");
+        untold.emplace_back("threads: a line in between may be of something else");
+        const activity &doing = told.activities[change->in];
+        if (doing.what == cause::TIMER && doing.asked_for == doing.entry) {
+            untold.emplace_back("who started the timer");
+        }
     }
     return untold;
 }

@@ -79,11 +79,20 @@ bool take_heads(std::string_view &line, std::string &moment)
     return true;
 }
 
+template <size_t count> bool holds_one(std::string_view text, const std::array<const char *, count> &pieces)
+{
+    return std::any_of(pieces.begin(), pieces.end(),
+                       [&](const char *piece) { return text.find(piece) != std::string_view::npos; });
+}
+
 bool sounds_like_us(const log_line &line)
 {
-    constexpr std::array pieces = {"kiv_led_", "kiv_mirta_led", "messageParse", "recv REG_"};
-    return std::any_of(pieces.begin(), pieces.end(),
-                       [&](const char *piece) { return line.text.find(piece) != std::string::npos; });
+    return holds_one(line.text, std::array{"kiv_led_", "kiv_mirta_led", "messageParse", "recv REG_"});
+}
+
+bool tells_of_dropped_lines(std::string_view line)
+{
+    return holds_one(line, std::array{"Suppressed ", "rate-limiting", "messages lost"});
 }
 } // namespace
 
@@ -98,6 +107,8 @@ std::vector<log_line> own_lines(std::string_view log)
         const bool text = line.find('\0') == std::string_view::npos; // else a program, or what a power cut has left
         if (text && take_heads(line, moment)) {
             named.push_back({number, moment, without_end(line)});
+        } else if (text && tells_of_dropped_lines(line)) {
+            (named.empty() ? bare : named).push_back({number, moment, DROPPED_LINES});
         } else if (text && named.empty() && !take(line, head_of_another())) {
             bare.push_back({number, moment, without_end(line)});
         }

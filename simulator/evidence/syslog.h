@@ -11,5 +11,8 @@ struct log_line {
     std::string text;   // what the daemon logged
 };
 
+// Stands in the place of lines that the logger says it has dropped.
+constexpr const char *DROPPED_LINES = "(the logger has dropped lines)";
+
 // The daemon's own lines. Where no line names it, but some sound like it, each one counts that names no other process.
 std::vector<log_line> own_lines(std::string_view log);

@@ -120,6 +120,15 @@ TEST(Log, SaysWhenItWasKeptWithoutTheLinesThatTellRequests)
               std::string::npos);
 }
 
+TEST(Log, SaysWhereTheLoggerDroppedLines)
+{
+    const log_history log = read("kiv_mirta_led: enter kiv_led_set_sms_led_off\n"
+                                 "Nov 22 20:15:01 cpe systemd-journald[9]: Suppressed 12 messages from led.service\n");
+    EXPECT_NE(why(log.told, LED_SMS_BLUE, log.calls->entries.size())
+                  .find("what the logger has dropped, for the last time at Nov 22 20:15:01 (line 2)"),
+              std::string::npos);
+}
+
 TEST(Log, RefusesWhatHoldsNoLineOfTheDaemon)
 {
     for (const std::string &text : {std::string(), std::string("\n\n\n"), std::string(9000, '\0'),
