@@ -249,8 +249,8 @@ void take_failure(reading &in, const std::string &text)
     if (!result || name.empty()) {
         return;
     }
-    name =
-        name.substr(0, holds(name, " led fail:") ? name.find(' ') : std::min(name.find(" off "), name.find(" fail")));
+    const size_t end = holds(name, " led fail:") ? name.find(' ') : std::min(name.find(" off "), name.find(" fail"));
+    name.resize(std::min(end, name.size()));
     name.erase(name.find_last_not_of(' ') + 1);
     if (const size_t digit = name.find_first_of("0123456789"); digit != std::string::npos) {
         name = led_name(atoi(name.c_str() + digit));
