@@ -149,7 +149,7 @@ TEST(Log, ReadsLinesThatWereCutAnywhere)
     std::string error;
     ASSERT_TRUE(load_recording(RECORDINGS "/handheld.trace", trace, error)) << error;
     const std::string whole = log_of(trace, framings[1].frame).substr(0, 3000);
-    for (size_t size = 100; size < whole.size(); size++) {
+    for (size_t size = 100; size < whole.size(); size += 7) {
         const log_history log = read(whole.substr(0, size));
         EXPECT_NE(why(log.told, LED_BAT_GREEN, log.calls->entries.size()), "") << size;
         read(whole.substr(0, size / 2) + "\n" + whole.substr(size));
