@@ -23,18 +23,15 @@ enum family : unsigned {
 };
 std::string family_names(unsigned families);
 
-// What the device and the daemon do for one statement.
-enum class act : uint8_t { TEXT, TELL, INDICATE, START, KILL, CLOCK, REFUSE, REPAIR, PASS };
+// A statement of a scenario, made ready.
 struct action {
-    act what = act::PASS;
+    verb what = verb::AFTER;
     uint8_t key = 0;
-    uint8_t value = 0; // a text, an hour or a refused call
-    int event_id = 0;
-    int64_t ms = 0;
+    uint8_t value = 0;  // a text, or a refused call
+    int64_t number = 0; // the statement's, an indication or what a notification says
     received message = {};
     uint16_t module = 0;
     uint32_t event = 0;
-    int payload = 0;
 };
 
 struct stimulus {

@@ -2,6 +2,7 @@
 
 #include "core/dispatch.h"
 #include "core/start.h"
+#include "ground/led_ctx.h"
 #include "language/messages.h"
 
 #include <cstdlib>
@@ -9,8 +10,8 @@
 
 // The bounds of the section in which seal-daemon has laid the daemon's statics.
 extern "C" {
-extern std::byte __start_led_state[];
-extern std::byte __stop_led_state[];
+extern std::byte led_state_begin[];
+extern std::byte led_state_end[];
 }
 
 // Copying passes the gaps that a sanitizer keeps between variables.
@@ -31,14 +32,14 @@ ALL_BYTES static void copy_bytes(std::byte *to, const std::byte *from, size_t si
 
 static size_t daemon_size()
 {
-    return static_cast<size_t>(__stop_led_state - __start_led_state);
+    return static_cast<size_t>(led_state_end - led_state_begin);
 }
 
 ALL_BYTES bool daemon_holds(int word)
 {
     for (size_t at = 0; at + sizeof word <= daemon_size(); at += alignof(int)) {
         int found;
-        __builtin_memcpy(&found, __start_led_state + at, sizeof found);
+        __builtin_memcpy(&found, led_state_begin + at, sizeof found);
         if (found == word) {
             return true;
         }
@@ -54,13 +55,13 @@ size_t snapshot_size()
 void take_snapshot(snapshot &into)
 {
     memcpy(into.bytes.data(), &world, sizeof world);
-    copy_bytes(into.bytes.data() + sizeof world, __start_led_state, daemon_size());
+    copy_bytes(into.bytes.data() + sizeof world, led_state_begin, daemon_size());
 }
 
 void put_back(const snapshot &from)
 {
     memcpy(&world, from.bytes.data(), sizeof world);
-    copy_bytes(__start_led_state, from.bytes.data() + sizeof world, daemon_size());
+    copy_bytes(led_state_begin, from.bytes.data() + sizeof world, daemon_size());
     happened = {};
 }
 
@@ -72,7 +73,7 @@ static const std::array<std::byte, SNAPSHOT_MAX> &pristine()
         if (snapshot_size() > SNAPSHOT_MAX) {
             abort();
         }
-        copy_bytes(bytes.data(), __start_led_state, daemon_size());
+        copy_bytes(bytes.data(), led_state_begin, daemon_size());
         return bytes;
     }();
     return image;
@@ -80,24 +81,26 @@ static const std::array<std::byte, SNAPSHOT_MAX> &pristine()
 
 void cold_daemon()
 {
-    copy_bytes(__start_led_state, pristine().data(), daemon_size());
+    copy_bytes(led_state_begin, pristine().data(), daemon_size());
     world.timers = {};
-    world.running = 0;
 }
 
 void start_daemon()
 {
-    cold_daemon();
     if (kiv_led_start() != 0) {
         abort(); // no thread can fail to start here
     }
-    world.running = 1;
     deliver_relights();
 }
 
 void kill_daemon()
 {
     cold_daemon();
+    world.power = POWER_NOT_YET;
+    world.asleep = 0;
+    world.call_up = 0;
+    world.restarting = 0;
+    world.excused = 0;
 }
 
 received received_of(const std::string &bytes)

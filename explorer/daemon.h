@@ -20,7 +20,7 @@ void take_snapshot(snapshot &into);
 void put_back(const snapshot &from);
 
 void cold_daemon();  // as the program's file has it; no timer runs
-void start_daemon(); // cold, handshake, initial scene; pending relights are delivered
+void start_daemon(); // a cold one: handshake, initial scene; pending relights are delivered
 void kill_daemon();
 
 // A message as it lies in the receive buffer, whole.

@@ -1,7 +1,7 @@
 #include "explore.h"
 
 #include "history.h"
-#include "oddities.h"
+#include "search.h"
 
 #include "ground/led_ctx.h"
 #include "kiv/adabsp.h"
@@ -9,9 +9,6 @@
 #include <algorithm>
 #include <chrono>
 #include <cstring>
-#include <random>
-#include <unistd.h>
-#include <unordered_map>
 
 volatile sig_atomic_t is_interrupted;
 
@@ -19,106 +16,10 @@ namespace
 {
 constexpr uint64_t STATES_BETWEEN_REPORTS = 1 << 16;
 
-struct searching {
-    search_plan plan;
-    std::vector<stimulus> alphabet;
-    state_store store;
-    search_result result;
-    std::unordered_map<std::string, led_picture> healed; // by NV and clock: the picture after a power cycle
-    std::chrono::steady_clock::time_point since;
-};
-
-std::vector<size_t> history_of(const searching &in, state_place place)
-{
-    std::vector<size_t> history;
-    for (; parent_of(in.store, place) != NO_STATE; place = parent_of(in.store, place)) {
-        history.push_back(stimulus_into(in.store, place));
-    }
-    std::reverse(history.begin(), history.end());
-    return history;
-}
-
-std::string name_of(const breach &what)
-{
-    return "unknown " + std::to_string(what.broken) + " " + subject_of(what);
-}
-
-// A breach in the state at place, or on the step from it by a stimulus.
-void note(searching &in, const breach &what, state_place place, std::optional<size_t> step, const std::string &epilogue)
-{
-    const oddity *known = oddity_of(in.plan.product, what);
-    const bool after_failures = (in.plan.families & FAULTS) != 0;
-    if (after_failures && what.broken != FAILURES_HEAL && what.broken != NO_TRAP) {
-        return; // what a refused request leaves unlit or lit is no breach until a power cycle has left it so
-    }
-    finding &entry = in.result.findings[known != nullptr ? std::string(known->name) : name_of(what)];
-    if (entry.times++ > 0) {
-        return;
-    }
-    entry.what = what;
-    entry.oddity = known != nullptr ? known->name : "";
-    entry.history = history_of(in, place);
-    if (step) {
-        entry.history.push_back(*step);
-    }
-    entry.epilogue = epilogue;
-}
-
-// The LEDs that stand differently from the picture, in the given places.
-void compare_pictures(const led_picture &wanted, property broken, unsigned product, std::vector<breach> &found)
-{
-    for (size_t led = 0; led < wanted.size(); led++) {
-        if (world.leds[led] != wanted[led] && !is_told_by_notification(product, static_cast<int>(led))) {
-            found.push_back(
-                {.broken = broken, .led = static_cast<int>(led), .shown = world.leds[led], .due = wanted[led]});
-        }
-    }
-}
-
-std::string nv_and_clock()
-{
-    std::string key(reinterpret_cast<const char *>(world.texts.data()), world.texts.size());
-    key += static_cast<char>(world.hour);
-    return key;
-}
-
-// The picture that NV and the clock lead to: the first history that comes by says which.
-void check_healed(searching &in, state_place place, const std::string &epilogue)
-{
-    const auto [known, is_first] = in.healed.try_emplace(nv_and_clock(), world.leds);
-    if (is_first) {
-        return;
-    }
-    std::vector<breach> found;
-    const bool after_failures = (in.plan.families & FAULTS) != 0;
-    compare_pictures(known->second, after_failures ? FAILURES_HEAL : HEALING, in.plan.product, found);
-    for (const breach &what : found) {
-        note(in, what, place, {}, epilogue);
-    }
-}
-
-void check_healing(searching &in, state_place place, const snapshot &state)
-{
-    restart_and_switch_on(in.plan.product);
-    check_healed(in, place, text_of_restarting(in.plan.product));
-    put_back(state);
-    if (has_power_events(in.plan.product)) {
-        switch_off_and_on(in.plan.product);
-        check_healed(in, place, text_of_switching(in.plan.product));
-        put_back(state);
-    }
-}
-
 void check_new_state(searching &in, state_place place)
 {
-    static snapshot state;
-    std::vector<breach> found;
-    check_state(in.plan.product, found);
-    for (const breach &what : found) {
-        note(in, what, place, {}, "");
-    }
-    take_snapshot(state);
-    check_healing(in, place, state);
+    check_here(in, place);
+    check_healing(in, place);
 }
 
 bool same_snapshot(const snapshot &one, const snapshot &other)
@@ -148,7 +49,7 @@ void check_morning(searching &in, state_place from, size_t step)
     take_snapshot(morning);
     fire_timer_of(timer_purpose::TEMPERATURE);
     const led_picture seen = world.leds;
-    restart_and_switch_on(in.plan.product);
+    restart_and_switch_on(in.cycles);
     const led_picture wanted = world.leds;
     put_back(morning);
     for (size_t led = 0; led < seen.size(); led++) {
@@ -159,7 +60,15 @@ void check_morning(searching &in, state_place from, size_t step)
     }
 }
 
-void take_step(searching &in, state_place from, size_t step)
+// Most stimuli change nothing: then there is no need to look the state up.
+found_state reach(searching &in, state_place place, const snapshot &from, size_t step)
+{
+    static snapshot now;
+    take_snapshot(now);
+    return same_snapshot(now, from) ? found_state{place, false} : add_state(in.store, place, step);
+}
+
+void take_step(searching &in, state_place place, const snapshot &from, size_t step)
 {
     const stimulus &what = in.alphabet[step];
     const bool was_night = is_night();
@@ -167,28 +76,17 @@ void take_step(searching &in, state_place from, size_t step)
         return;
     }
     if (was_night && !is_night() && is_on_and_awake() && world.refused == 0 && !is_reminding()) {
-        check_morning(in, from, step);
+        check_morning(in, place, step);
     }
     in.result.transitions++;
-    const found_state reached = add_state(in.store, from, step);
-    if (what.indication) {
-        check_repetition(in, from, step);
+    const bool is_quiet = happened.led_requests == 0;
+    const found_state reached = reach(in, place, from, step);
+    if (what.indication && !(is_quiet && reached.place == place)) {
+        check_repetition(in, place, step);
     }
     if (reached.is_new) {
         check_new_state(in, reached.place);
     }
-}
-
-void report_progress(const searching &in, state_place at)
-{
-    if (isatty(STDERR_FILENO) == 0) {
-        return;
-    }
-    const std::chrono::duration<double> took = std::chrono::steady_clock::now() - in.since;
-    fprintf(stderr, "\r%s, %s: %lu states, depth %u, %.0f %% of them explored, %.2f million transitions a second ",
-            std::string(all_products()[in.plan.product].name).c_str(), family_names(in.plan.families).c_str(),
-            in.store.states, in.result.depth, 100.0 * static_cast<double>(at) / static_cast<double>(in.store.used),
-            static_cast<double>(in.result.transitions) / took.count() / 1e6);
 }
 
 void explore_state(searching &in, state_place place)
@@ -197,7 +95,7 @@ void explore_state(searching &in, state_place place)
     read_state(in.store, place, from);
     for (size_t step = 0; step < in.alphabet.size(); step++) {
         put_back(from);
-        take_step(in, place, step);
+        take_step(in, place, from, step);
     }
 }
 
@@ -263,81 +161,9 @@ void drop_unheard(std::vector<stimulus> &alphabet)
 {
     std::erase_if(alphabet, [](const stimulus &what) {
         const action *last = what.actions.empty() ? nullptr : &what.actions.back();
-        return last != nullptr && last->what == act::TELL && last->module != 0 && last->module != KIV_MODULE_SLEEP &&
+        return last != nullptr && last->what == verb::SEND && last->module != 0 && last->module != KIV_MODULE_SLEEP &&
                !is_registered(last->module, last->event);
     });
-}
-
-// Whether a history leads to something that nobody knows under that name.
-bool leads_to(searching &in, const std::vector<size_t> &history, const snapshot &start, const std::string &name)
-{
-    std::vector<breach> found;
-    put_back(start);
-    for (const size_t step : history) {
-        apply(in.alphabet[step], in.plan.product);
-    }
-    check_state(in.plan.product, found);
-    return std::any_of(found.begin(), found.end(), [&](const breach &what) {
-        return oddity_of(in.plan.product, what) == nullptr && name_of(what) == name;
-    });
-}
-
-// Leaves out every step that is not needed.
-void shorten(searching &in, std::vector<size_t> &history, const snapshot &start, const std::string &name)
-{
-    for (size_t at = history.size(); at-- > 0;) {
-        std::vector<size_t> shorter = history;
-        shorter.erase(shorter.begin() + static_cast<std::ptrdiff_t>(at));
-        if (leads_to(in, shorter, start, name)) {
-            history = std::move(shorter);
-        }
-    }
-}
-
-// Known oddities are left to the searches, which find their shortest histories.
-void check_walk(searching &in, const std::vector<size_t> &path, const snapshot &start)
-{
-    static snapshot here;
-    std::vector<breach> found;
-    check_state(in.plan.product, found);
-    for (const breach &what : found) {
-        if (oddity_of(in.plan.product, what) != nullptr) {
-            continue;
-        }
-        const std::string name = name_of(what);
-        finding &entry = in.result.findings[name];
-        if (entry.times++ == 0) {
-            take_snapshot(here);
-            entry.what = what;
-            entry.history = path;
-            shorten(in, entry.history, start, name);
-            put_back(here);
-        }
-    }
-}
-
-// Everything together, at random but the same on every run: walks from the first state.
-void walk(searching &in)
-{
-    constexpr uint64_t WALK_STEPS = 2000;
-    std::mt19937 random(in.plan.product);
-    std::vector<size_t> path;
-    snapshot start;
-    take_snapshot(start);
-    while (in.result.transitions < in.plan.steps && is_interrupted == 0) {
-        put_back(start);
-        path.clear();
-        while (path.size() < WALK_STEPS) {
-            const size_t step = random() % in.alphabet.size();
-            happened = {};
-            if (apply(in.alphabet[step], in.plan.product)) {
-                path.push_back(step);
-                check_walk(in, path, start);
-            }
-        }
-        in.result.transitions += path.size();
-        report_progress(in, in.store.used);
-    }
 }
 
 void tell_findings(searching &in)
@@ -352,10 +178,12 @@ void tell_findings(searching &in)
 
 search_result search(const search_plan &plan)
 {
-    searching in = {.plan = plan, .alphabet = {}, .store = {}, .result = {}, .healed = {}, .since = {}};
+    searching in;
+    in.plan = plan;
     in.since = std::chrono::steady_clock::now();
     in.alphabet = alphabet_of(plan.product, plan.families);
     open_store(in.store);
+    open_power_cycles(in.cycles, plan.product);
     furnish(plan.product);
     apply(stimulus_of("start"), plan.product);
     drop_unheard(in.alphabet);
@@ -373,8 +201,9 @@ search_result search(const search_plan &plan)
     in.result.interrupted = is_interrupted != 0;
     in.result.states = in.store.states;
     tell_findings(in);
-    in.result.bytes = in.store.used + in.store.table.size() * sizeof(uint64_t);
+    in.result.bytes = bytes_of(in.store) + bytes_of(in.cycles.switched_off);
     in.result.seconds = std::chrono::duration<double>(std::chrono::steady_clock::now() - in.since).count();
     close_store(in.store);
+    close_store(in.cycles.switched_off);
     return in.result;
 }

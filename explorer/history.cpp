@@ -1,5 +1,7 @@
 #include "history.h"
 
+#include "language/words.h"
+
 #include <algorithm>
 
 namespace
@@ -81,8 +83,8 @@ void play(const stimulus &what, unsigned product)
 {
     for (const action &one : what.actions) {
         apply({.text = {}, .actions = {one}, .fires = {}}, product);
-        if (one.what == act::PASS) {
-            pass_until(timing.now_ms + one.ms);
+        if (one.what == verb::AFTER) {
+            pass_until(timing.now_ms + one.number / NS_PER_MS);
         }
     }
 }

@@ -1,4 +1,5 @@
 // kiv_led_explore: visits every state that the daemon can reach, and says where a property of its LEDs breaks.
+#include "answer.h"
 #include "report.h"
 
 #include <CLI/CLI.hpp>
@@ -17,8 +18,8 @@ struct explore_options {
     std::vector<std::string> products;
     std::vector<std::string> families;
     bool singles_only = false;
-    uint64_t most_states = 2'000'000; // of one family; a pair is given a fifth of them
-    uint64_t steps = 20'000'000;
+    uint64_t most_states = 5'000'000; // of one family; a pair is given less
+    uint64_t steps = 10'000'000;      // ten walks: a hundred million
     unsigned jobs = 1;
     std::string document;
     std::string scenarios;
@@ -57,27 +58,30 @@ std::vector<unsigned> wanted_families(const explore_options &options, unsigned p
 void plan_product(const explore_options &options, unsigned product, std::vector<job> &jobs)
 {
     const std::vector<unsigned> families = wanted_families(options, product);
-    constexpr uint64_t SHARE_OF_A_PAIR = 5;
-    const auto add = [&](unsigned of, uint64_t steps, uint64_t share = 1) {
+    constexpr uint64_t SHARE_OF_A_PAIR = 25;
+    const uint64_t most_of_a_pair =
+        options.most_states == 0 ? 0 : std::max(options.most_states / SHARE_OF_A_PAIR, uint64_t{1});
+    const auto add = [&](unsigned of, uint64_t most_states, uint64_t steps = 0) {
         jobs.emplace_back().plan = {
-            .product = product, .families = POWER | of, .most_states = options.most_states / share, .steps = steps};
+            .product = product, .families = POWER | of, .most_states = most_states, .steps = steps};
     };
     if (is_wanted(options.families, "power")) {
-        add(0, 0);
+        add(0, options.most_states);
     }
     for (const unsigned of : families) {
-        add(of, 0);
+        add(of, options.most_states);
     }
     if (options.singles_only) {
         return;
     }
     for (size_t first = 0; first < families.size(); first++) {
         for (size_t second = first + 1; second < families.size(); second++) {
-            add(families[first] | families[second], 0, SHARE_OF_A_PAIR);
+            add(families[first] | families[second], most_of_a_pair);
         }
     }
     if (options.steps != 0 && options.families.empty()) {
-        add(families_of(product) & ~FAULTS, options.steps);
+        add(families_of(product) & ~FAULTS, 0, options.steps);
+        add(families_of(product), 0, options.steps);
     }
 }
 
@@ -198,6 +202,7 @@ std::vector<std::string> names_of_families()
 }
 } // namespace
 
+// NOLINTNEXTLINE(bugprone-exception-escape): without memory the exploration ends
 int main(int argc, char **argv)
 {
     explore_options options;
@@ -209,7 +214,7 @@ int main(int argc, char **argv)
         ->check(CLI::IsMember(names_of_families()));
     app.add_flag("--single", options.singles_only, "Each family by itself: no pairs of them, no walks");
     app.add_option("--states", options.most_states, "A search ends with the level that exceeds them; 0 never does");
-    app.add_option("--steps", options.steps, "Steps of each product's walk at random; 0 for none");
+    app.add_option("--steps", options.steps, "Steps of each walk at random, two for a product; 0 for none");
     app.add_option("--jobs", options.jobs, "Searches at once")->check(CLI::Range(1U, 64U));
     app.add_option("--document", options.document, "Write what was found, as a page, to this file");
     app.add_option("--scenarios", options.scenarios, "Write the oddities as scenarios to this folder");

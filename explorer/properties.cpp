@@ -4,7 +4,6 @@
 #include "kiv/adabsp.h"
 
 #include <algorithm>
-#include <map>
 
 bool is_night()
 {
@@ -204,47 +203,23 @@ void check_module_signal(unsigned product, std::vector<breach> &found)
     found.push_back({.broken = HEALING, .led = LED_VOICE_GREEN});
 }
 
-const stimulus &made(const std::string &text)
-{
-    static std::map<std::string, stimulus> known;
-    const auto at = known.find(text);
-    return at != known.end() ? at->second : known.emplace(text, stimulus_of(text)).first->second;
-}
-
-constexpr std::string_view TWENTY_SECONDS = "after 20s\n";
-
-// Both timers of twenty seconds; it is the devices's longest period.
-void pass_twenty_seconds()
-{
-    fire_timer_of(timer_purpose::TEMPERATURE);
-    fire_timer_of(timer_purpose::NIGHT);
-}
 } // namespace
 
 std::string_view property_text(unsigned which)
 {
-    switch (which) {
-    case ONE_COLOUR:
-        return "of a group whose colours exclude one another at most one is lit";
-    case OWN_LEDS:
-        return "an LED that the product does not have is never lit";
-    case OFF_IS_DARK:
-        return "off means dark, except what is named for the power state";
-    case SLEEP_IS_DARK:
-        return "asleep shows only what is named for the product";
-    case NIGHT_IS_DIM:
-        return "nothing shines brighter than the night allows, and the morning shows what NV says";
-    case HEALING:
-        return "off and on again, or a restart, shows a picture that depends on NV alone";
-    case TIMERS_KEPT:
-        return "no timer is lost, doubled or outlives what it is for";
-    case NO_NOISE:
-        return "an indication that changes nothing asks for nothing, and repeating one changes nothing";
-    case FAILURES_HEAL:
-        return "what a failed platform call has left, the next power cycle heals";
-    default:
-        return "from every state everything can be reached again";
-    }
+    constexpr std::array<std::string_view, PROPERTY_COUNT - 1> texts = {
+        "of a group whose colours exclude one another at most one is lit",
+        "an LED that the product does not have is never lit",
+        "off means dark, except what is named for the power state",
+        "asleep shows only what is named for the product",
+        "nothing shines brighter than the night allows, and the morning shows what NV says",
+        "off and on again, or a restart, shows a picture that depends on NV alone",
+        "no timer is lost, doubled or outlives what it is for",
+        "an indication that changes nothing asks for nothing, and repeating one changes nothing",
+        "what a failed platform call has left, the next power cycle heals",
+        "from every state everything can be reached again",
+    };
+    return texts[which - ONE_COLOUR];
 }
 
 std::string subject_of(const breach &what)
@@ -291,46 +266,4 @@ bool is_told_by_notification(unsigned product, int led)
 {
     return (product == UFI && led == LED_SMS_BLUE) || (product == UNI_CORE && led == LED_VOICE_BLUE) ||
            (product == MODULE && is_one_of(led, {LED_VOICE_BLUE, LED_VOICEMAIL_GREEN}));
-}
-
-bool has_power_events(unsigned product)
-{
-    return product != DATA_CARD && product != PAPER_KITE;
-}
-
-static std::string switched_on(unsigned product)
-{
-    return has_power_events(product) ? "notify MAIN POWERON\n" : "";
-}
-
-static std::string switching(unsigned)
-{
-    return "repair all\nnotify SLEEP 0\nnotify MAIN SHUTTING_DOWN\nnotify MAIN POWERON\n";
-}
-
-static std::string restarting(unsigned product)
-{
-    return "repair all\nkill\nstart\n" + switched_on(product);
-}
-
-void switch_off_and_on(unsigned product)
-{
-    apply(made(switching(product)), product);
-    pass_twenty_seconds();
-}
-
-void restart_and_switch_on(unsigned product)
-{
-    apply(made(restarting(product)), product);
-    pass_twenty_seconds();
-}
-
-std::string text_of_switching(unsigned product)
-{
-    return switching(product) + std::string(TWENTY_SECONDS);
-}
-
-std::string text_of_restarting(unsigned product)
-{
-    return restarting(product) + std::string(TWENTY_SECONDS);
 }

@@ -28,23 +28,16 @@ struct breach {
     bool is_lost = false;       // the timer: doubled, or nobody keeps its handle
     uint8_t shown = 0;          // the LED's look
     uint8_t due = 0;            // and what it should be, where that is known
+    bool restarted = false;     // by a power cycle that restarts the daemon
     std::string_view said = {}; // the indication
 };
 std::string subject_of(const breach &what); // the LED's or the timer's name
-
-using led_picture = std::array<uint8_t, LED_ID_COUNT>;
 
 // In the state as it stands.
 void check_state(unsigned product, std::vector<breach> &found);
 
 // LEDs that show what only a notification has told: switching off and on cannot know them.
 bool is_told_by_notification(unsigned product, int led);
-
-void switch_off_and_on(unsigned product); // mended, awake, off, on, and twenty seconds
-void restart_and_switch_on(unsigned product);
-std::string text_of_switching(unsigned product);
-std::string text_of_restarting(unsigned product);
-bool has_power_events(unsigned product);
 
 bool is_night(); // by the daemon's own word in NV
 bool is_gated_at_night(int led);

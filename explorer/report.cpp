@@ -5,7 +5,6 @@
 
 #include <algorithm>
 #include <cinttypes>
-#include <cstring>
 
 namespace
 {
@@ -56,16 +55,45 @@ bool is_better(const finding &one, const finding &other)
     return one.shows != other.shows ? one.shows : one.history.size() < other.history.size();
 }
 
+std::string events_of(const search_plan &plan)
+{
+    if (plan.steps == 0) {
+        return family_names(plan.families);
+    }
+    return (plan.families & FAULTS) != 0 ? "all of them" : "all but faults";
+}
+
 std::string table_of_searches(const report &all)
 {
-    std::string text = "| product | what happens, beside power, sleep, night, heat and restarts | stimuli | explored | "
-                       "states | transitions |\n| --- | --- | ---: | --- | ---: | ---: |\n";
+    std::string text = "| product | events | stimuli | explored | states | transitions |\n"
+                       "| --- | --- | ---: | --- | ---: | ---: |\n";
     for (const search_result &result : all.results) {
-        text += "| " + product_of(result.plan) + " | " + family_names(result.plan.families) + " | " +
-                std::to_string(result.stimuli) + " | " + extent_of(result) + " | " + with_commas(result.states) +
-                " | " + with_commas(result.transitions) + " |\n";
+        text += "| " + product_of(result.plan) + " | " + events_of(result.plan) + " | " +
+                std::to_string(result.stimuli) + " | " + extent_of(result) + " | " +
+                (result.plan.steps == 0 ? with_commas(result.states) : "") + " | " + with_commas(result.transitions) +
+                " |\n";
     }
     return text;
+}
+
+std::string sum_of_searches(const report &all)
+{
+    uint64_t complete = 0;
+    uint64_t searches = 0;
+    uint64_t states = 0;
+    uint64_t transitions = 0;
+    uint64_t steps = 0;
+    for (const search_result &result : all.results) {
+        (result.plan.steps == 0 ? transitions : steps) += result.transitions;
+        if (result.plan.steps == 0) {
+            complete += result.complete ? 1 : 0;
+            states += result.states;
+            searches++;
+        }
+    }
+    return "Of " + with_commas(searches) + " searches " + with_commas(complete) +
+           " have seen every state. Together they visited " + with_commas(states) + " states by " +
+           with_commas(transitions) + " transitions; the walks took " + with_commas(steps) + " steps.\n\n";
 }
 
 std::string properties_and_oddities(const report &all)
@@ -97,12 +125,15 @@ std::string list_of_oddities(const report &all)
 }
 } // namespace
 
+static bool holds(const search_result &result)
+{
+    return std::all_of(result.findings.begin(), result.findings.end(),
+                       [](const auto &entry) { return !entry.second.oddity.empty(); });
+}
+
 bool all_hold(const report &all)
 {
-    return std::all_of(all.results.begin(), all.results.end(), [](const search_result &result) {
-        return std::all_of(result.findings.begin(), result.findings.end(),
-                           [](const auto &entry) { return !entry.second.oddity.empty(); });
-    });
+    return std::all_of(all.results.begin(), all.results.end(), holds);
 }
 
 std::vector<known_oddity> oddities_in(const report &all)
@@ -133,36 +164,58 @@ std::string scenario_of(const known_oddity &known)
     return as_comment(find_oddity(known.name)->tale) + known.shortest->scenario;
 }
 
+// Everything that is not a list, in one piece; each %s is a list.
+static constexpr char PAGE[] = R"(# Every reachable state
+
+`kiv_led_explore` visits the states that the daemon and its device can reach and checks ten properties in them. It has
+written this page and the scenarios of the oddities; a test keeps them current. To write them again:
+
+    build/release/kiv_led_explore --jobs 2 --document docs/states.md --scenarios scenarios/oddities
+
+## The properties
+
+%s
+Where each is checked: 1 to 5 and 7 in every state, 6 from every state, 8 after every indication, and the morning of 5
+after every end of a night. In a search with faults only 9 and 10 are: what a refused call leaves unlit or lit is no breach
+until a power cycle has left it so. 9 is checked from every state of those searches, after any number of faults: refused
+LED requests, timers, NV reads and battery queries. 10 needs all states to be known, so that it is checked in the searches
+that have seen every state, and in no other. A walk checks 1 to 5 and 7 after every step and 6 after every fiftieth; with
+faults it checks 9 there and nothing else.
+
+## The oddities
+
+Where the described behaviour itself breaks a property, and how few steps it takes to see it. Each is a scenario of its
+name in `scenarios/oddities/`, the shortest there is.
+
+%s
+## What was explored
+
+"Every state" means that there are no others: each stimulus leads from each of them to one of them. Otherwise every
+history up to that number of steps was played, and nothing is known of longer ones but what the walks have met. A value in
+NV changes together with its notification, the clock stands at noon or at 23:00, and a timer may fire whenever it runs.
+Power, sleep, the night's beginning and end, heat, relights and restarts are part of every search. Walks are random but
+the same every time. `--states 0` goes on to the last state wherever memory and patience allow.
+
+%s)";
+
 std::string document_of(const report &all)
 {
-    return "# Every reachable state\n\n"
-           "`kiv_led_explore` visits the states that the daemon and its device can reach and checks ten properties in "
-           "each. It has written this page; a test keeps it current.\n\n"
-           "## The properties\n\n" +
-           properties_and_oddities(all) +
-           "\n## The oddities\n\n"
-           "Where the described behaviour itself breaks a property, and how few steps it takes to see it. Each is a "
-           "scenario of its name in `scenarios/oddities/`, the shortest there is.\n\n" +
-           list_of_oddities(all) +
-           "\n## What was explored\n\n"
-           "Every state means that there are no others: each stimulus leads from each of them to one of them; "
-           "otherwise "
-           "every history up to a number of steps was played. A value in NV changes together with its notification, "
-           "the "
-           "clock stands at noon or at 23:00, and a timer may fire whenever it runs. Property 10 is checked where "
-           "every "
-           "state is known, property 9 where faults are among the stimuli: refused LED requests, timers, NV reads and "
-           "battery queries, any number of them. `kiv_led_explore --states 0` goes to the fixed point wherever memory "
-           "and patience allow.\n\n" +
-           table_of_searches(all);
+    const std::array<std::string, 3> lists = {properties_and_oddities(all), list_of_oddities(all),
+                                              sum_of_searches(all) + table_of_searches(all)};
+    std::string page = PAGE;
+    for (const std::string &list : lists) {
+        page.replace(page.find("%s"), 2, list);
+    }
+    return page;
 }
 
 void print_row(FILE *out, const search_result &result)
 {
-    fprintf(out, "%-12s %-22s %3zu stimuli  %-14s %11" PRIu64 " states %13" PRIu64 " transitions %7.1f s %6.0f MB%s\n",
-            product_of(result.plan).c_str(), family_names(result.plan.families).c_str(), result.stimuli,
-            extent_of(result).c_str(), result.states, result.transitions, result.seconds,
-            static_cast<double>(result.bytes) / 1e6, result.interrupted ? "  interrupted" : "");
+    fprintf(out,
+            "%-12s %-22s %3zu stimuli  %-14s %11" PRIu64 " states %13" PRIu64 " transitions %7.1f s %6.0f MB%s%s\n",
+            product_of(result.plan).c_str(), events_of(result.plan).c_str(), result.stimuli, extent_of(result).c_str(),
+            result.states, result.transitions, result.seconds, static_cast<double>(result.bytes) / 1e6,
+            holds(result) ? "" : "  broken", result.interrupted ? "  interrupted" : "");
 }
 
 void print_unknown(FILE *out, const report &all)
@@ -178,71 +231,4 @@ void print_unknown(FILE *out, const report &all)
                     entry.scenario.c_str());
         }
     }
-}
-
-// Texts are written with their length, so that they may hold lines.
-static void write_text(FILE *out, const std::string &text)
-{
-    fprintf(out, "%zu:%s\n", text.size(), text.c_str());
-}
-
-static bool read_text(FILE *in, std::string &text)
-{
-    size_t size = 0;
-    if (fscanf(in, "%zu:", &size) != 1) {
-        return false;
-    }
-    text.resize(size);
-    return fread(text.data(), 1, size, in) == size && fgetc(in) == '\n';
-}
-
-void write_result(FILE *out, const search_result &result)
-{
-    fprintf(out, "%" PRIu64 " %" PRIu64 " %zu %u %d %d %" PRIu64 " %f %zu\n", result.states, result.transitions,
-            result.stimuli, result.depth, result.complete, result.interrupted, result.bytes, result.seconds,
-            result.findings.size());
-    for (const auto &[name, entry] : result.findings) {
-        fprintf(out, "%d %" PRIu64 " %zu %d\n", entry.what.broken, entry.times, entry.history.size(), entry.shows);
-        write_text(out, name);
-        write_text(out, entry.oddity);
-        write_text(out, entry.scenario);
-    }
-}
-
-static bool read_finding(FILE *in, search_result &result)
-{
-    finding entry;
-    std::string name;
-    int broken = 0;
-    int shows = 0;
-    size_t steps = 0;
-    if (fscanf(in, "%d %" SCNu64 " %zu %d\n", &broken, &entry.times, &steps, &shows) != 4 || !read_text(in, name) ||
-        !read_text(in, entry.oddity) || !read_text(in, entry.scenario)) {
-        return false;
-    }
-    entry.what.broken = static_cast<property>(broken);
-    entry.history.resize(steps);
-    entry.shows = shows != 0;
-    result.findings[name] = entry;
-    return true;
-}
-
-bool read_result(FILE *in, search_result &result)
-{
-    int complete = 0;
-    int interrupted = 0;
-    size_t findings = 0;
-    if (fscanf(in, "%" SCNu64 " %" SCNu64 " %zu %u %d %d %" SCNu64 " %lf %zu\n", &result.states, &result.transitions,
-               &result.stimuli, &result.depth, &complete, &interrupted, &result.bytes, &result.seconds,
-               &findings) != 9) {
-        return false;
-    }
-    result.complete = complete != 0;
-    result.interrupted = interrupted != 0;
-    while (findings-- > 0) {
-        if (!read_finding(in, result)) {
-            return false;
-        }
-    }
-    return true;
 }

@@ -25,7 +25,3 @@ std::string scenario_of(const known_oddity &known); // whole, with the product o
 std::string document_of(const report &all);
 void print_row(FILE *out, const search_result &result);
 void print_unknown(FILE *out, const report &all); // with their histories, as scenarios
-
-// Between the process that searches and the one that reports: one line of text each way of a value.
-void write_result(FILE *out, const search_result &result);
-bool read_result(FILE *in, search_result &result);

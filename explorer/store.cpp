@@ -154,6 +154,11 @@ void close_store(state_store &store)
     store.table = {};
 }
 
+uint64_t bytes_of(const state_store &store)
+{
+    return store.used + store.table.size() * sizeof(uint64_t);
+}
+
 found_state add_state(state_store &store, state_place parent, size_t stimulus)
 {
     static difference state;

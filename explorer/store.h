@@ -25,6 +25,7 @@ struct found_state {
 
 void open_store(state_store &store); // empty. Aborts when no address space is to be had
 void close_store(state_store &store);
+uint64_t bytes_of(const state_store &store);
 
 // Looks the world and the daemon as they stand now up, or adds them: reached from parent by a stimulus. The first
 // state that is added is the one from which all differences are taken.

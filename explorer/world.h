@@ -31,6 +31,8 @@ enum excuse : uint8_t {
     NET_SHOWN_WHILE_OFF = 1, // a changed close-all setting, or the single-chip terminal's wake-up, while off
     SWITCHED_ON_ASLEEP = 2,  // without the scene of falling asleep
     RELIT_ASLEEP = 4,        // or its close-all setting was changed
+    SETTINGS_UNREAD = 16,    // the night's and the temperature's, when NV could not be read or no timer be had
+    SWITCHED_ON_LIT = 32,    // a single-chip terminal whose net or signal LED was lit before
     MESSAGE_TIMER_LEFT = 8,  // switched on, or told of messages while off, with the timer of one running
 };
 
@@ -41,7 +43,6 @@ struct world_state {
     std::array<uint8_t, TIMER_KINDS> timers; // a bit for each that runs
     uint8_t refused;                         // refused_call
     uint8_t hour;                            // of the wall clock, UTC
-    uint8_t running;                         // 1 while the daemon lives
     // What the services have told the daemon, whatever it made of it.
     uint8_t power; // power_state
     uint8_t asleep;
