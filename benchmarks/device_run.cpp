@@ -67,25 +67,21 @@ static std::string make_directory()
     give_up(program.c_str());
 }
 
-// brightness: of a file that the payload's 0 or 1 is written into, as the LED's is; -1 for none.
-[[noreturn]] static void only_receive(const char *queue_name, int brightness, int ready)
+[[noreturn]] static void only_receive(int ready)
 {
-    svc_msg message;
+    std::array<char, KIV_SVC_MSG_SIZE> buffer;
     int queue = -1;
 
     prctl(PR_SET_PDEATHSIG, SIGKILL);
-    if (kiv_init_msg(queue_name, &queue) < 0 || write(ready, "", 1) != 1) {
-        give_up(queue_name);
+    if (kiv_init_msg(BARE_QUEUE, &queue) < 0 || write(ready, "", 1) != 1) {
+        give_up(BARE_QUEUE);
     }
     for (;;) {
-        recv(queue, &message, sizeof message, 0);
-        if (brightness >= 0 && pwrite(brightness, message.p_data[0] == '1' ? "2\n" : "0\n", 2, 0) != 2) {
-            give_up("the bare LED");
-        }
+        recv(queue, buffer.data(), buffer.size(), 0);
     }
 }
 
-static pid_t start_receiver(const char *queue_name, int brightness)
+static pid_t start_bare_receiver()
 {
     std::array<int, 2> ready;
     char byte;
@@ -94,25 +90,14 @@ static pid_t start_receiver(const char *queue_name, int brightness)
     }
     const pid_t pid = fork();
     if (pid == 0) {
-        only_receive(queue_name, brightness, ready[1]);
+        only_receive(ready[1]);
     }
     close(ready[1]);
     if (pid < 0 || read(ready[0], &byte, 1) != 1) {
-        give_up(queue_name);
+        give_up(BARE_QUEUE);
     }
     close(ready[0]);
     return pid;
-}
-
-void start_bare_led(device_run &device)
-{
-    const std::string path = device.dir + BARE_BRIGHTNESS;
-    const int brightness = open(path.c_str(), O_RDWR | O_CREAT | O_CLOEXEC, 0600);
-    if (brightness < 0 || write(brightness, "2\n", 2) != 2) {
-        give_up(path.c_str());
-    }
-    device.bare_led = start_receiver(BARE_LED_QUEUE, brightness);
-    close(brightness);
 }
 
 static int32_t receive_record(int queue)
@@ -154,7 +139,7 @@ device_run start_device()
     for (const char *variable : {"KIV_TRACE", "KIV_FAULTS", "KIV_LED_DIR", "KIV_LED_MAP"}) {
         unsetenv(variable);
     }
-    device.bare = start_receiver(BARE_QUEUE, -1);
+    device.bare = start_bare_receiver();
     device.daemon = start_daemon();
 
     const svc_msg power_on = notification(KIV_MODULE_MAIN, REG_MC_EVENT_POWERON, "");
@@ -164,11 +149,9 @@ device_run start_device()
 
 void end_device(device_run &device)
 {
-    for (const pid_t pid : {device.daemon, device.bare, device.bare_led}) {
-        if (pid > 0) {
-            kill(pid, SIGKILL);
-            waitpid(pid, nullptr, 0);
-        }
+    for (const pid_t pid : {device.daemon, device.bare}) {
+        kill(pid, SIGKILL);
+        waitpid(pid, nullptr, 0);
     }
     fs::remove_all(device.dir);
 }
