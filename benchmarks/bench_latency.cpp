@@ -1,5 +1,6 @@
-// From the send of a notification to the LED's file, beside a method call on a D-Bus daemon, turn and turn about. The
-// D-Bus daemon is the one that DBUS_SESSION_BUS_ADDRESS names.
+// From the send of a notification to the LED's file, beside a process that only receives it and writes the same file
+// and beside a method call on a D-Bus daemon, turn and turn about. The D-Bus daemon is the one that
+// DBUS_SESSION_BUS_ADDRESS names.
 #include "device_run.h"
 #include "kiv/reg.h"
 
@@ -64,13 +65,13 @@ static led_watch watch_led(const std::string &path)
     return watch;
 }
 
-static double led_us(const led_watch &watch, bool on)
+static double led_us(const char *queue_name, const led_watch &watch, bool on)
 {
     const svc_msg message = notification(KIV_MODULE_WLAN, REG_WLAN_CURRENT_STATUS, on ? "1" : "0");
     const auto from = steady::now();
 
-    if (kiv_send_msg(LED_QUEUE, &message, message_length(message)) != 0) {
-        give_up(LED_QUEUE);
+    if (kiv_send_msg(queue_name, &message, message_length(message)) != 0) {
+        give_up(queue_name);
     }
     wait_until_shows(watch, on ? LIT : DARK);
     return us_since(from);
@@ -102,29 +103,34 @@ static void send_to_led_file(benchmark::State &state)
 {
     device_run device = start_device();
     const led_watch watch = watch_led(device.dir + WIFI_BRIGHTNESS);
+    start_bare_led(device);
+    const led_watch bare_watch = watch_led(device.dir + BARE_BRIGHTNESS);
     DBusConnection *bus = dbus_bus_get(DBUS_BUS_SESSION, nullptr);
     std::vector<double> led;
+    std::vector<double> bare;
     std::vector<double> dbus;
 
     if (bus == nullptr) {
         give_up("no D-Bus daemon");
     }
     for ([[maybe_unused]] auto turn : state) {
-        led.push_back(led_us(watch, led.size() % 2 == 1)); // it is LIT at first
+        const bool on = led.size() % 2 == 1; // they are LIT at first
+        led.push_back(led_us(LED_QUEUE, watch, on));
+        bare.push_back(led_us(BARE_LED_QUEUE, bare_watch, on));
         dbus.push_back(dbus_us(bus));
         state.SetIterationTime(led.back() * 1e-6);
     }
     end_device(device);
-    const double led_median = quantile(led, 0.5);
-    const double dbus_median = quantile(dbus, 0.5);
-    const double led_tail = quantile(led, 0.999);
-    const double dbus_tail = quantile(dbus, 0.999);
-    state.counters["1_ratio_median"] = led_median / dbus_median;
-    state.counters["2_ratio_p99.9"] = led_tail / dbus_tail;
-    state.counters["3_led_us"] = led_median;
-    state.counters["4_led_p99.9_us"] = led_tail;
-    state.counters["5_dbus_us"] = dbus_median;
-    state.counters["6_dbus_p99.9_us"] = dbus_tail;
+    const auto compare = [&](const char *name, std::vector<double> &other) {
+        state.counters[std::string("1_ratio_median_") + name] = quantile(led, 0.5) / quantile(other, 0.5);
+        state.counters[std::string("2_ratio_p99.9_") + name] = quantile(led, 0.999) / quantile(other, 0.999);
+    };
+    compare("bare", bare);
+    compare("dbus", dbus);
+    state.counters["3_led_us"] = quantile(led, 0.5);
+    state.counters["4_led_p99.9_us"] = quantile(led, 0.999);
+    state.counters["5_bare_us"] = quantile(bare, 0.5);
+    state.counters["6_dbus_us"] = quantile(dbus, 0.5);
 }
 BENCHMARK(send_to_led_file)->UseManualTime()->Iterations(TURNS)->Unit(benchmark::kMicrosecond);
 

@@ -67,21 +67,25 @@ static std::string make_directory()
     give_up(program.c_str());
 }
 
-[[noreturn]] static void only_receive(int ready)
+// brightness: of a file that the payload's 0 or 1 is written into, as the LED's is; -1 for none.
+[[noreturn]] static void only_receive(const char *queue_name, int brightness, int ready)
 {
-    std::array<char, KIV_SVC_MSG_SIZE> buffer;
+    svc_msg message;
     int queue = -1;
 
     prctl(PR_SET_PDEATHSIG, SIGKILL);
-    if (kiv_init_msg(BARE_QUEUE, &queue) < 0 || write(ready, "", 1) != 1) {
-        give_up(BARE_QUEUE);
+    if (kiv_init_msg(queue_name, &queue) < 0 || write(ready, "", 1) != 1) {
+        give_up(queue_name);
     }
     for (;;) {
-        recv(queue, buffer.data(), buffer.size(), 0);
+        recv(queue, &message, sizeof message, 0);
+        if (brightness >= 0 && pwrite(brightness, message.p_data[0] == '1' ? "2\n" : "0\n", 2, 0) != 2) {
+            give_up("the bare LED");
+        }
     }
 }
 
-static pid_t start_bare_receiver()
+static pid_t start_receiver(const char *queue_name, int brightness)
 {
     std::array<int, 2> ready;
     char byte;
@@ -90,14 +94,25 @@ static pid_t start_bare_receiver()
     }
     const pid_t pid = fork();
     if (pid == 0) {
-        only_receive(ready[1]);
+        only_receive(queue_name, brightness, ready[1]);
     }
     close(ready[1]);
     if (pid < 0 || read(ready[0], &byte, 1) != 1) {
-        give_up(BARE_QUEUE);
+        give_up(queue_name);
     }
     close(ready[0]);
     return pid;
+}
+
+void start_bare_led(device_run &device)
+{
+    const std::string path = device.dir + BARE_BRIGHTNESS;
+    const int brightness = open(path.c_str(), O_RDWR | O_CREAT | O_CLOEXEC, 0600);
+    if (brightness < 0 || write(brightness, "2\n", 2) != 2) {
+        give_up(path.c_str());
+    }
+    device.bare_led = start_receiver(BARE_LED_QUEUE, brightness);
+    close(brightness);
 }
 
 static int32_t receive_record(int queue)
@@ -139,7 +154,7 @@ device_run start_device()
     for (const char *variable : {"KIV_TRACE", "KIV_FAULTS", "KIV_LED_DIR", "KIV_LED_MAP"}) {
         unsetenv(variable);
     }
-    device.bare = start_bare_receiver();
+    device.bare = start_receiver(BARE_QUEUE, -1);
     device.daemon = start_daemon();
 
     const svc_msg power_on = notification(KIV_MODULE_MAIN, REG_MC_EVENT_POWERON, "");
@@ -149,9 +164,11 @@ device_run start_device()
 
 void end_device(device_run &device)
 {
-    for (const pid_t pid : {device.daemon, device.bare}) {
-        kill(pid, SIGKILL);
-        waitpid(pid, nullptr, 0);
+    for (const pid_t pid : {device.daemon, device.bare, device.bare_led}) {
+        if (pid > 0) {
+            kill(pid, SIGKILL);
+            waitpid(pid, nullptr, 0);
+        }
     }
     fs::remove_all(device.dir);
 }

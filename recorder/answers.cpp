@@ -26,8 +26,8 @@ answer parse_answer(const std::string &tail)
         return {0, ""};
     }
     char *rest = nullptr;
-    const long result = strtol(tail.c_str() + strlen(RESULT_MARK), &rest, 10);
-    return {static_cast<int>(result), rest};
+    const long long result = strtoll(tail.c_str() + strlen(RESULT_MARK), &rest, 10);
+    return {result, rest};
 }
 
 void put_handle(const answer &told, int *handle)
@@ -52,6 +52,14 @@ void put_text(const answer &told, void *buffer, int size)
     const std::optional<std::string> text = told_text(told);
     if (text && size > 0) {
         memcpy(buffer, text->c_str(), std::min(text->size() + 1, static_cast<size_t>(size)));
+    }
+}
+
+void put_bytes(const answer &told, void *buffer, size_t size)
+{
+    const std::optional<std::string> text = told_text(told);
+    if (text) {
+        memcpy(buffer, text->data(), std::min(text->size(), size));
     }
 }
 

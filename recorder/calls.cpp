@@ -13,9 +13,6 @@ namespace
 {
 enum { LOG_LINE_MAX = 4096 };
 
-void no_arguments(trace_line &) {}
-void nothing(const answer &) {}
-
 int simple_call(const char *call, const void *caller, auto arguments, auto work)
 {
     return front_call(call, caller, arguments, work, trace_result, nothing);
@@ -36,8 +33,6 @@ int query(const char *call, const void *caller, bsp_query_result *result, auto r
         [&](const answer &told) { put_query(told, result); });
 }
 } // namespace
-
-#define CALLER __builtin_return_address(0)
 
 extern "C" {
 
@@ -153,7 +148,7 @@ int kiv_bsp_set_leds_sync(led_request request, int *result)
         [&](const answer &told) {
             returned = told.result == 0 ? 0 : -1;
             if (result) {
-                *result = told.result;
+                *result = static_cast<int>(told.result);
             }
         });
     return returned;
@@ -178,25 +173,15 @@ int kiv_bsp_get_sensor_temp_sync(int sensor_id, bsp_sensor_temp *temp)
         [&](const answer &told) { put_temperature(told, temp); });
 }
 
-int kiv_bsp_register_battery_online_ind(bsp_ind_callback callback)
-{
-    return register_ind(__func__, CALLER, BATTERY_ONLINE, callback, next().kiv_bsp_register_battery_online_ind);
-}
-
-int kiv_bsp_register_battery_offline_ind(bsp_ind_callback callback)
-{
-    return register_ind(__func__, CALLER, BATTERY_OFFLINE, callback, next().kiv_bsp_register_battery_offline_ind);
-}
-
-int kiv_bsp_register_charger_connect_ind(bsp_ind_callback callback)
-{
-    return register_ind(__func__, CALLER, CHARGER_CONNECT, callback, next().kiv_bsp_register_charger_connect_ind);
-}
-
-int kiv_bsp_register_charger_disconnect_ind(bsp_ind_callback callback)
-{
-    return register_ind(__func__, CALLER, CHARGER_DISCONNECT, callback, next().kiv_bsp_register_charger_disconnect_ind);
-}
+#define REGISTER_IND(name, slot)                                                                                       \
+    int name(bsp_ind_callback callback)                                                                                \
+    {                                                                                                                  \
+        return register_ind(__func__, CALLER, slot, callback, next().name);                                            \
+    }
+REGISTER_IND(kiv_bsp_register_battery_online_ind, BATTERY_ONLINE)
+REGISTER_IND(kiv_bsp_register_battery_offline_ind, BATTERY_OFFLINE)
+REGISTER_IND(kiv_bsp_register_charger_connect_ind, CHARGER_CONNECT)
+REGISTER_IND(kiv_bsp_register_charger_disconnect_ind, CHARGER_DISCONNECT)
 
 int kiv_ipc_init(int log_id, int flag)
 {
@@ -210,7 +195,7 @@ int kiv_timer(timer_callback callback, void *argument, int period_ms, int repeat
     return front_call(
         __func__, CALLER, [&](trace_line &line) { trace_timer(line, period_ms, repeat); },
         [&] { return start_timer(callback, argument, period_ms, repeat); }, trace_result,
-        [&](const answer &told) { keep_timer(told.result, callback, argument); });
+        [&](const answer &told) { keep_timer(static_cast<int>(told.result), callback, argument); });
 }
 
 int kiv_delete_timer(int handle)

@@ -64,11 +64,19 @@ struct next_functions {
     KIV_NEXT_FUNCTIONS(X)
 #undef X
 };
-const next_functions &next(); // found at its first call
+const next_functions &next(); // found at its first call; also before the constructors of this library
+
+// Where the callers lie that the daemon consists of: the program, and for what it calls last in a function, which
+// returns elsewhere, this library and the C library.
+void find_callers();
+bool is_program(const void *caller);
+bool is_daemon(const void *caller);
+
+#define CALLER __builtin_return_address(0)
 
 // The recorded end of a line, behind ") = ": the result, and what the call handed out.
 struct answer {
-    int result;
+    long long result;
     const char *rest;
 };
 
@@ -76,21 +84,14 @@ struct answer {
 void put_handle(const answer &told, int *handle);
 void put_message(const answer &told, void *buffer, int size);
 void put_text(const answer &told, void *buffer, int size);
+void put_bytes(const answer &told, void *buffer, size_t size);
 void put_item(const answer &told, int item, void *buffer, int size);
 void put_query(const answer &told, bsp_query_result *result);
 void put_temperature(const answer &told, bsp_sensor_temp *temp);
+inline void nothing(const answer &) {}
+inline void no_arguments(trace_line &) {}
 
 // The daemon's callbacks, and what the device's libraries are given in their place.
 using timer_callback = void (*)(void *);
 enum ind_slot { BATTERY_ONLINE, BATTERY_OFFLINE, CHARGER_CONNECT, CHARGER_DISCONNECT, IND_SLOTS };
 bsp_ind_callback keep_callback(ind_slot slot, bsp_ind_callback callback);
-
-inline const next_functions &find_next(next_functions &found)
-{
-    if (!found.open) {
-#define X(name) found.name = reinterpret_cast<decltype(found.name)>(dlsym(RTLD_NEXT, #name));
-        KIV_NEXT_FUNCTIONS(X)
-#undef X
-    }
-    return found;
-}

@@ -6,7 +6,6 @@
 #include <climits>
 #include <cstdio>
 #include <cstring>
-#include <link.h>
 #include <sys/resource.h>
 #include <sys/stat.h>
 #include <sys/uio.h>
@@ -16,14 +15,6 @@ namespace
 constexpr size_t RECORD_MAX_DEFAULT = 4 * 1024 * 1024;
 constexpr size_t RECORD_MAX_LEAST = 64 * 1024; // a line has up to 9 KiB
 constexpr size_t PRODUCT_SIZE = 128;
-
-struct address_range {
-    ElfW(Addr) begin;
-    ElfW(Addr) end;
-};
-
-std::array<address_range, 3> daemons; // the main program, this library, the C library
-int ranges;
 
 pthread_mutex_t lock = PTHREAD_MUTEX_INITIALIZER; // the file, and all below it here
 std::atomic<int> file{-1};                        // -1: nothing is recorded, or nothing any more
@@ -49,31 +40,6 @@ void give_up(const char *what, int failure)
         next().close(old);
         say(what, failure);
     }
-}
-
-bool lies_in(const dl_phdr_info &info, const void *address, address_range &range)
-{
-    const auto at = reinterpret_cast<ElfW(Addr)>(address);
-    range = {~ElfW(Addr){0}, 0};
-    for (int i = 0; i < info.dlpi_phnum; i++) {
-        const ElfW(Phdr) &segment = info.dlpi_phdr[i];
-        if (segment.p_type == PT_LOAD) {
-            range.begin = std::min<ElfW(Addr)>(range.begin, info.dlpi_addr + segment.p_vaddr);
-            range.end = std::max<ElfW(Addr)>(range.end, info.dlpi_addr + segment.p_vaddr + segment.p_memsz);
-        }
-    }
-    return at >= range.begin && at < range.end;
-}
-
-// The first object of the list is the main program.
-int take_ranges(dl_phdr_info *info, size_t, void *c_library)
-{
-    address_range range = {};
-    const bool ours = lies_in(*info, reinterpret_cast<const void *>(take_ranges), range);
-    if ((ranges == 0 || ours || lies_in(*info, c_library, range)) && ranges < static_cast<int>(daemons.size())) {
-        daemons[static_cast<size_t>(ranges++)] = range;
-    }
-    return 0;
 }
 
 // Whole lines only: the half of one that a killed process has left is taken off.
@@ -140,19 +106,15 @@ void put(const trace_line &line)
     give_up("the recording ends", failure);
 }
 
-[[gnu::noinline]] void put_start()
+[[gnu::noinline]] void put_head(bool goes_on)
 {
     trace_line line;
-    trace_begin(line, "kiv_trace");
-    trace_start(line);
-    put(line);
-}
-
-[[gnu::noinline]] void put_goes_on()
-{
-    trace_line line;
-    trace_begin(line, "kiv_trace_goes_on");
-    trace_goes_on(line, product.data());
+    trace_begin(line, goes_on ? "kiv_trace_goes_on" : "kiv_trace");
+    if (goes_on) {
+        trace_goes_on(line, product.data());
+    } else {
+        trace_start(line);
+    }
     put(line);
 }
 
@@ -167,7 +129,7 @@ void change_files()
     }
     file = fresh;
     next().close(old);
-    put_goes_on();
+    put_head(true);
 }
 
 size_t parse_size(const char *text)
@@ -194,7 +156,7 @@ size_t max_of_one_file()
 __attribute__((constructor)) void begin_recording()
 {
     const char *name = getenv("KIV_RECORD");
-    dl_iterate_phdr(take_ranges, reinterpret_cast<void *>(next().system));
+    find_callers();
     if (!name || !*name || !next().kiv_recv_msg) {
         return; // not asked for, or a program in front of the daemon, such as a shell
     }
@@ -209,29 +171,15 @@ __attribute__((constructor)) void begin_recording()
     unsetenv("KIV_RECORD_MAX");
     file = fd;
     if (fd >= 0) {
-        put_start();
+        put_head(false);
     }
 }
 } // namespace
 
-const next_functions &next()
+// Never built with a sanitizer, as the C library's front calls it.
+__attribute__((no_sanitize("thread"))) bool takes_call(const void *caller)
 {
-    static constinit next_functions found = {};
-    return find_next(found);
-}
-
-bool record_takes(const void *caller)
-{
-    if (file < 0 || depth > 0) {
-        return false;
-    }
-    const auto at = reinterpret_cast<ElfW(Addr)>(caller);
-    for (const address_range &range : daemons) {
-        if (at >= range.begin && at < range.end) {
-            return true;
-        }
-    }
-    return false;
+    return file.load() >= 0 && depth == 0 && is_daemon(caller);
 }
 
 void record_enter()

@@ -79,6 +79,30 @@ template <ind_slot slot> int on_indication(int event_id, int arg2, void *record)
 }
 } // namespace
 
+bool front_sleep(const char *call, unsigned amount)
+{
+    trace_line line;
+    trace_begin(line, call);
+    trace_add(line, "%u", amount);
+    trace_close(line);
+    record_write(line);
+    return true;
+}
+
+// A thread is an event only when there is none.
+extern "C" int pthread_create(pthread_t *id, const pthread_attr_t *attributes, void *(*body)(void *),
+                              void *argument) noexcept
+{
+    const int result = next().pthread_create(id, attributes, body, argument);
+    if (result != 0 && takes_call(CALLER)) {
+        trace_line line;
+        trace_begin(line, "pthread_create");
+        trace_result(line, result);
+        record_write(line);
+    }
+    return result;
+}
+
 int start_timer(timer_callback callback, void *argument, int period_ms, int repeat)
 {
     timer_slot *slot = take_slot();

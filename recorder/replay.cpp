@@ -20,7 +20,9 @@ struct player_thread {
     std::string label; // empty until its first line tells it
     doing what = doing::STARTS;
     std::string call; // that it makes: "NAME(ARGUMENTS"
-    size_t event = 0; // the line that a service carries out
+    size_t event = 0; // the line that it carries out
+    void *(*body)(void *) = nullptr;
+    void *argument = nullptr;
     std::condition_variable turn;
 };
 
@@ -33,13 +35,11 @@ std::mutex lock; // everything below
 recording trace;
 std::vector<std::string> tails; // of each line, from the end of its arguments on
 size_t now;                     // the next line
-size_t end;
 std::list<player_thread> threads;
 std::map<int, timer> timers;
 bsp_ind_callback callbacks[IND_SLOTS];
-replay_status *status;
+replay_page *page;
 FILE *out;
-bool lines_count;
 thread_local player_thread *self;
 
 std::string call_of(const trace_entry &entry)
@@ -52,7 +52,7 @@ std::string without_line(const std::string &call)
 {
     const size_t file = call.find('"');
     const size_t number = file == std::string::npos ? file : call.find(", ", call.find('"', file + 1));
-    if (lines_count || !call.starts_with("kiv_syslog_append(") || number == std::string::npos) {
+    if (page->lines || !call.starts_with("kiv_syslog_append(") || number == std::string::npos) {
         return call;
     }
     const size_t behind = call.find(',', number + 2);
@@ -66,9 +66,9 @@ bool is_same(const std::string &call, const trace_entry &entry)
 
 [[noreturn]] void finish(replay_verdict verdict, const std::string &done)
 {
-    status->line = now;
-    snprintf(status->done, sizeof status->done, "%s", done.c_str());
-    status->verdict = verdict;
+    page->line = now;
+    snprintf(page->done, sizeof page->done, "%s", done.c_str());
+    page->verdict = verdict;
     if (out) {
         fflush(out);
     }
@@ -83,7 +83,7 @@ void advance(const std::string &call)
         const std::string head = entry.line.substr(0, entry.line.find(' ') + 1) + entry.thread + " ";
         fprintf(out, "%s%s%s\n", head.c_str(), call.c_str(), tails[now].c_str());
     }
-    status->line = ++now;
+    page->line = ++now;
 }
 
 bool blocks(const std::string &call)
@@ -121,19 +121,17 @@ std::string what_it_does(const player_thread &thread)
     finish(REPLAY_SAME, "");
 }
 
-bool can_be(const player_thread &thread, const trace_entry &entry)
+// What the line tells is what the thread stands before.
+bool is_next(const player_thread &thread, const trace_entry &entry)
 {
-    const bool nameless = thread.label.empty() || (thread.label[0] == 't' && thread.label != "timer");
-    if (!nameless) {
-        return false;
-    }
-    if (entry.call == "kiv_timer_fire") {
-        return thread.what == doing::SERVES_TIMERS;
-    }
-    if (entry.call == "kiv_bsp_ind") {
-        return thread.what == doing::SERVES_LOOP;
-    }
-    return thread.what == doing::CALLS && is_same(thread.call, entry);
+    return (thread.what == doing::SERVES_TIMERS && entry.call == "kiv_timer_fire") ||
+           (thread.what == doing::SERVES_LOOP && entry.call == "kiv_bsp_ind") ||
+           (thread.what == doing::CALLS && is_same(thread.call, entry));
+}
+
+bool may_be_called(const player_thread &thread)
+{
+    return thread.label.empty() || (thread.label[0] == 't' && thread.label != "timer");
 }
 
 // The thread of a line: by its name, or, where the name is new, by what the line says.
@@ -145,7 +143,7 @@ player_thread *find_thread(const trace_entry &entry)
         }
     }
     for (player_thread &thread : threads) {
-        if (can_be(thread, entry)) {
+        if (may_be_called(thread) && is_next(thread, entry)) {
             thread.label = entry.thread;
             return &thread;
         }
@@ -163,12 +161,6 @@ void resume(player_thread &thread)
 {
     thread.what = doing::RUNS;
     thread.turn.notify_one();
-}
-
-bool is_event_of(const player_thread &thread, const trace_entry &entry)
-{
-    return (thread.what == doing::SERVES_TIMERS && entry.call == "kiv_timer_fire") ||
-           (thread.what == doing::SERVES_LOOP && entry.call == "kiv_bsp_ind");
 }
 
 [[noreturn]] void differ(const player_thread *thread)
@@ -191,10 +183,10 @@ void schedule()
             return;
         }
     }
-    while (now < end && is_aside(trace.entries[now])) {
+    while (now < page->end && is_aside(trace.entries[now])) {
         advance(call_of(trace.entries[now]));
     }
-    if (now == end) {
+    if (now == page->end) {
         finish_same();
     }
     const trace_entry &entry = trace.entries[now];
@@ -202,12 +194,9 @@ void schedule()
     if (!thread) {
         differ(nullptr);
     }
-    if (is_event_of(*thread, entry)) {
+    if (is_next(*thread, entry)) {
         thread->event = now;
-        advance(call_of(entry));
-    } else if (thread->what == doing::CALLS && is_same(thread->call, entry)) {
-        thread->event = now;
-        advance(thread->call);
+        advance(thread->what == doing::CALLS ? thread->call : call_of(entry));
     } else if (thread->what != doing::WAITS) {
         differ(thread);
     }
@@ -228,21 +217,13 @@ player_thread &add_thread(doing what)
     return thread;
 }
 
-struct thread_start {
-    void *(*body)(void *);
-    void *argument;
-    player_thread *thread;
-};
-
-void *run_thread(void *given)
+void *run_thread(void *thread)
 {
-    const thread_start start = *static_cast<thread_start *>(given);
-    delete static_cast<thread_start *>(given);
     std::unique_lock guard(lock);
-    self = start.thread;
+    self = static_cast<player_thread *>(thread);
     self->turn.wait(guard, [] { return self->what == doing::RUNS; });
     guard.unlock();
-    start.body(start.argument);
+    self->body(self->argument);
     guard.lock();
     self->what = doing::RESTS;
     schedule();
@@ -268,17 +249,6 @@ void *serve_timers(void *)
         const timer due = known->second;
         guard.unlock();
         due.callback(due.argument);
-    }
-}
-
-void start_timer_service()
-{
-    static bool started = false;
-    pthread_t thread;
-    if (!started) {
-        started = true;
-        next().pthread_create(&thread, nullptr, run_thread,
-                              new thread_start{serve_timers, nullptr, &add_thread(doing::STARTS)});
     }
 }
 
@@ -313,36 +283,28 @@ void serve_indication()
     callback(event_number(entry), 0, null ? nullptr : record);
 }
 
-const char *variable(const char *name)
-{
-    const char *value = getenv(name);
-    return value ? value : "";
-}
-
 void read_recording()
 {
     std::string error;
-    if (!load_recording(variable(REPLAY_TRACE_VARIABLE), trace, error)) {
+    if (!load_recording(page->trace, trace, error)) {
         finish(REPLAY_UNREADABLE, error);
     }
-    now = strtoul(variable(REPLAY_FROM_VARIABLE), nullptr, 10);
-    end = std::min<size_t>(strtoul(variable(REPLAY_TO_VARIABLE), nullptr, 10), trace.entries.size());
-    lines_count = getenv(REPLAY_LINES_VARIABLE) != nullptr;
+    now = page->line;
+    page->end = std::min(page->end, trace.entries.size());
     for (const trace_entry &entry : trace.entries) {
         tails.push_back(entry.line.substr(entry.line.find(call_of(entry)) + call_of(entry).size()));
     }
-    if (const char *path = getenv(REPLAY_OUT_VARIABLE)) {
-        out = fopen(path, "ae");
+    if (page->out[0]) {
+        out = fopen(page->out, "ae");
     }
 }
-
 } // namespace
 
 // The daemon ends by itself. Where the recording ends too, that is the same.
 __attribute__((destructor)) static void end_replay()
 {
-    if (status && status->verdict == REPLAY_GOES_ON) {
-        finish(now == end ? REPLAY_SAME : REPLAY_DIFFERS, now == end ? "" : "the daemon ends");
+    if (page && page->verdict == REPLAY_GOES_ON) {
+        finish(now == page->end ? REPLAY_SAME : REPLAY_DIFFERS, now == page->end ? "" : "the daemon ends");
     }
 }
 
@@ -363,7 +325,7 @@ void replay_wait_for_turn()
 const std::string *replay_next_is(const char *call)
 {
     const std::lock_guard guard(lock);
-    for (size_t at = now; at < end; at++) {
+    for (size_t at = now; at < page->end; at++) {
         if (trace.entries[at].thread == self->label) {
             return trace.entries[at].call == call ? &tails[at] : nullptr;
         }
@@ -378,10 +340,13 @@ int start_timer(timer_callback, void *, int, int)
 
 void keep_timer(int handle, timer_callback callback, void *argument)
 {
+    pthread_t service;
+    if (handle > 0 && timers.empty()) {
+        replay_create(&service, nullptr, serve_timers, nullptr);
+    }
     const std::lock_guard guard(lock);
     if (handle > 0) {
         timers[handle] = {callback, argument};
-        start_timer_service();
     }
 }
 
@@ -409,20 +374,23 @@ void replay_serve_loop()
 int replay_create(pthread_t *id, const pthread_attr_t *attributes, void *(*body)(void *), void *argument)
 {
     const std::lock_guard guard(lock);
-    return next().pthread_create(id, attributes, run_thread,
-                                 new thread_start{body, argument, &add_thread(doing::STARTS)});
+    player_thread &thread = add_thread(doing::STARTS);
+    thread.body = body;
+    thread.argument = argument;
+    return next().pthread_create(id, attributes, run_thread, &thread);
 }
 
 // Before the daemon's first line. The page is shared with whoever started the replay.
 static bool begin_replay()
 {
-    const int fd = open(variable(REPLAY_STATUS_VARIABLE), O_RDWR | O_CLOEXEC);
-    void *page = fd < 0 ? MAP_FAILED : mmap(nullptr, sizeof *status, PROT_READ | PROT_WRITE, MAP_SHARED, fd, 0);
-    if (page == MAP_FAILED) {
+    const char *file = getenv(REPLAY_VARIABLE);
+    const int fd = file ? open(file, O_RDWR | O_CLOEXEC) : -1;
+    void *shared = fd < 0 ? MAP_FAILED : mmap(nullptr, sizeof *page, PROT_READ | PROT_WRITE, MAP_SHARED, fd, 0);
+    if (shared == MAP_FAILED) {
         fputs("libkivreplay: to be used by kiv_led_sim replay\n", stderr);
         _exit(2);
     }
-    status = static_cast<replay_status *>(page);
+    page = static_cast<replay_page *>(shared);
     read_recording();
     self = &add_thread(doing::RUNS);
     self->label = "main";

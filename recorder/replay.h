@@ -6,6 +6,10 @@
 
 #include <string>
 
+constexpr bool REPLAYS = true;
+
+bool takes_call(const void *caller); // the daemon's own
+
 // Waits until the recording goes on with this thread's call. Ends the process when it goes on with something else.
 // Returns what stands behind the arguments: ") = 0" and the rest.
 const std::string &replay_take(const trace_line &line);
@@ -19,15 +23,17 @@ const std::string *replay_next_is(const char *call);
 answer parse_answer(const std::string &tail);
 
 template <typename Arguments, typename Work, typename Results, typename Answer>
-int front_call(const char *call, const void *, Arguments arguments, Work, Results, Answer put)
+auto front_call(const char *call, const void *, Arguments arguments, Work work, Results, Answer put)
 {
     trace_line line;
     trace_begin(line, call);
     arguments(line);
     const answer told = parse_answer(replay_take(line));
     put(told);
-    return told.result;
+    return static_cast<decltype(work())>(told.result);
 }
+
+bool front_sleep(const char *call, unsigned amount); // false: nothing waits in real time
 
 int start_timer(timer_callback callback, void *argument, int period_ms, int repeat); // none runs here
 void keep_timer(int handle, timer_callback callback, void *argument);

@@ -172,15 +172,15 @@ bool check(player &p, const statement &s)
     std::string shown;
     std::string error;
     for (int left = r.options.real_time ? RETRIES_IN_REAL_TIME : 1; left > 0; left--) {
-        const surroundings around = {r.state,  r.line.changes,     r.line.requests,
-                                     r.device, printed_in_step(r), r.process.pid >= 0};
+        const std::string printed = s.wanted.what == subject::OUTPUT ? printed_in_step(r) : "";
+        const surroundings around = {r.state, r.line.changes, r.line.requests, r.device, printed, r.process.pid >= 0};
         if (holds(s.wanted, around, shown)) {
             p.end_known |= s.wanted.what == subject::ENDED;
             p.held++;
             return true;
         }
-        if (left > 1) {
-            pass_time(r, r.now_ns + 50 * NS_PER_MS, error);
+        if (left > 1 && !pass_time(r, r.now_ns + 50 * NS_PER_MS, error)) {
+            return failed(p, s, "the daemon comes to rest", error);
         }
     }
     return failed(p, s, s.text.substr(s.text.find(' ') + 1), shown);

@@ -266,6 +266,10 @@ bool pass_time(rig &r, int64_t until_ns, std::string &error)
         went_on = pass_virtual_time(r, until_ns, error);
     }
     timeline_flush(r.line, r.state);
+    if (went_on && r.process.lost_trace) {
+        error = "the daemon " + r.process.end + ": its trace could not be written";
+        return false;
+    }
     return went_on;
 }
 

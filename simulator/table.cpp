@@ -10,33 +10,14 @@
 #include <sys/wait.h>
 #include <unistd.h>
 
+using namespace product_set;
+
 namespace
 {
-enum product_mask : unsigned {
-    UFI = 1,
-    DATA_CARD = 2,
-    PAPER_KITE = 4,
-    MODULE = 8,
-    UNI_CORE = 16,
-    POWERED = UFI | MODULE | UNI_CORE, // told when the device is on
-    WIFI = UFI | PAPER_KITE | UNI_CORE,
-    WPS = PAPER_KITE | UNI_CORE,
-    REMINDED = UFI | PAPER_KITE | UNI_CORE,
-    EVERY = 31,
-};
-
-struct product_row {
-    std::string_view name;
-    unsigned mask;
-};
-
-constexpr std::array product_rows = {
-    product_row{"UFI",          UFI       },
-    product_row{"DATA_CARD",    DATA_CARD },
-    product_row{"PAPER_KITE",   PAPER_KITE},
-    product_row{"MODULE",       MODULE    },
-    product_row{"UNI_CORE_CPE", UNI_CORE  },
-};
+constexpr unsigned POWERED = UFI | MODULE | UNI_CORE_CPE; // told when the device is on
+constexpr unsigned WIFI = UFI | PAPER_KITE | UNI_CORE_CPE;
+constexpr unsigned WPS = PAPER_KITE | UNI_CORE_CPE;
+constexpr unsigned REMINDED = UFI | PAPER_KITE | UNI_CORE_CPE;
 
 struct state_row {
     unsigned products;
@@ -53,85 +34,75 @@ constexpr std::string_view POWER_ON = "notify MAIN POWERON\n";
 
 // What happens to the device, and to no LED: the daemon decides what that shows.
 constexpr std::array states = {
-    state_row{EVERY,                         "",                                                          "Power"                                                              },
-    state_row{EVERY,                         "on, nothing else to tell",                                  ""                                                                   },
-    state_row{UFI,                           "self-test, first 200 ms",                                   "notify MAIN INITAL"                                                 },
-    state_row{UFI,                           "self-test, afterwards",                                     "notify MAIN INITAL\nafter 1s"                                       },
-    state_row{POWERED,                       "shutting down",                                             "notify MAIN SHUTTING_DOWN"                                          },
-    state_row{POWERED,                       "restarting",                                                "notify MAIN RESTARTING"                                             },
-    state_row{UFI | UNI_CORE,                "resetting to factory settings",                             "notify MAIN RESETTING"                                              },
-    state_row{UFI | MODULE,                  "off, charging",                                             "nv battery_charging=1\ncharger 1\nnotify MAIN POWER_OFF_CHARGE"     },
-    state_row{UFI | MODULE,                  "off, charged",                                              "nv battery_charging=2\ncharger 1\nnotify MAIN POWER_OFF_CHARGE"     },
-    state_row{POWERED,                       "off, but only for the eye",                                 "notify MAIN POWER_OFF_UNREADL"                                      },
-    state_row{UFI,                           "quick power off",                                           "notify MAIN POWER_OFF_QUICKEN"                                      },
-    state_row{UFI,                           "quick power off, charging",                                 "nv battery_charging=1\nnotify MAIN POWER_OFF_CHARGE_QUICKEN"        },
-    state_row{UFI | MODULE,                  "asleep",                                                    "notify SLEEP 1"                                                     },
-    state_row{UNI_CORE,                      "asleep",                                                    "notify SLEEP 5"                                                     },
+    state_row{EVERY_PRODUCT,                     "",                                                          "Power"                                                              },
+    state_row{EVERY_PRODUCT,                     "on, nothing else to tell",                                  ""                                                                   },
+    state_row{UFI,                               "self-test, first 200 ms",                                   "notify MAIN INITAL"                                                 },
+    state_row{UFI,                               "self-test, afterwards",                                     "notify MAIN INITAL\nafter 1s"                                       },
+    state_row{POWERED,                           "shutting down",                                             "notify MAIN SHUTTING_DOWN"                                          },
+    state_row{POWERED,                           "restarting",                                                "notify MAIN RESTARTING"                                             },
+    state_row{UFI | UNI_CORE_CPE,                "resetting to factory settings",                             "notify MAIN RESETTING"                                              },
+    state_row{UFI | MODULE,                      "off, charging",                                             "nv battery_charging=1\ncharger 1\nnotify MAIN POWER_OFF_CHARGE"     },
+    state_row{UFI | MODULE,                      "off, charged",                                              "nv battery_charging=2\ncharger 1\nnotify MAIN POWER_OFF_CHARGE"     },
+    state_row{POWERED,                           "off, but only for the eye",                                 "notify MAIN POWER_OFF_UNREADL"                                      },
+    state_row{UFI,                               "quick power off",                                           "notify MAIN POWER_OFF_QUICKEN"                                      },
+    state_row{UFI,                               "quick power off, charging",                                 "nv battery_charging=1\nnotify MAIN POWER_OFF_CHARGE_QUICKEN"        },
+    state_row{UFI | MODULE,                      "asleep",                                                    "notify SLEEP 1"                                                     },
+    state_row{UNI_CORE_CPE,                      "asleep",                                                    "notify SLEEP 5"                                                     },
 
-    state_row{UFI | MODULE,                  "",                                                          "Battery"                                                            },
-    state_row{UFI | MODULE,                  "10 %",                                                      "nv battery_value=10\nnotify MAIN BATTERY_VALUE"                     },
-    state_row{UFI | MODULE,                  "20 %",                                                      "nv battery_value=20\nnotify MAIN BATTERY_VALUE"                     },
-    state_row{UFI | MODULE,                  "40 %",                                                      "nv battery_value=40\nnotify MAIN BATTERY_VALUE"                     },
-    state_row{UFI | MODULE,                  "10 %, charging",
-              "nv battery_value=10 battery_charging=1\ncharger 1\nnotify MAIN CHARGIN_STATUS"                                                                                  },
-    state_row{UFI | MODULE,                  "40 %, charging",
-              "nv battery_value=40 battery_charging=1\ncharger 1\nnotify MAIN CHARGIN_STATUS"                                                                                  },
-    state_row{UFI | MODULE,                  "80 %, charging",                                            "nv battery_charging=1\ncharger 1\nnotify MAIN CHARGIN_STATUS"       },
-    state_row{UFI | MODULE,                  "charged",                                                   "nv battery_charging=2\ncharger 1\nnotify MAIN CHARGIN_STATUS"       },
-    state_row{UFI | MODULE,                  "none in the device",                                        "nv battery_exist=0\nbattery 0\nnotify MAIN BATTERY_VALUE"           },
-    state_row{MODULE,                        "charger connected",                                         "charger 1\nindication 1356"                                         },
+    state_row{UFI | MODULE,                      "",                                                          "Battery"                                                            },
+    state_row{UFI | MODULE,                      "10 %",                                                      "nv battery_value=10\nnotify MAIN BATTERY_VALUE"                     },
+    state_row{UFI | MODULE,                      "20 %",                                                      "nv battery_value=20\nnotify MAIN BATTERY_VALUE"                     },
+    state_row{UFI | MODULE,                      "40 %",                                                      "nv battery_value=40\nnotify MAIN BATTERY_VALUE"                     },
+    state_row{UFI | MODULE,                      "10 %, charging",
+              "nv battery_value=10 battery_charging=1\ncharger 1\nnotify MAIN CHARGIN_STATUS"                                                                                      },
+    state_row{UFI | MODULE,                      "40 %, charging",
+              "nv battery_value=40 battery_charging=1\ncharger 1\nnotify MAIN CHARGIN_STATUS"                                                                                      },
+    state_row{UFI | MODULE,                      "80 %, charging",                                            "nv battery_charging=1\ncharger 1\nnotify MAIN CHARGIN_STATUS"       },
+    state_row{UFI | MODULE,                      "charged",                                                   "nv battery_charging=2\ncharger 1\nnotify MAIN CHARGIN_STATUS"       },
+    state_row{UFI | MODULE,                      "none in the device",                                        "nv battery_exist=0\nbattery 0\nnotify MAIN BATTERY_VALUE"           },
+    state_row{MODULE,                            "charger connected",                                         "charger 1\nindication 1356"                                         },
 
-    state_row{EVERY,                         "",                                                          "Network"                                                            },
-    state_row{EVERY,                         "limited or no service",                                     "nv network_type=LIMITED_SERVICE_GSM\nnotify NWINFO NETTYPE"         },
-    state_row{EVERY,                         "2G",                                                        "nv network_type=EDGE\nnotify NWINFO NETTYPE"                        },
-    state_row{EVERY,                         "3G",                                                        "nv network_type=HSPA+\nnotify NWINFO NETTYPE"                       },
-    state_row{EVERY,                         "5G",                                                        "nv network_type=SA\nnotify NWINFO NETTYPE"                          },
-    state_row{MODULE,                        "3G, roaming",
-              "nv network_type=HSPA+ simcard_roam=Roaming\nnotify NWINFO NETTYPE\nnotify NWINFO ROAMING_STATUS"                                                                },
-    state_row{MODULE,                        "4G, roaming",                                               "nv simcard_roam=Roaming\nnotify NWINFO ROAMING_STATUS"              },
-    state_row{DATA_CARD | MODULE | UNI_CORE, "no signal bar",                                             "nv signalbar=0\nnotify NWINFO SIG_BAR"                              },
-    state_row{DATA_CARD | MODULE | UNI_CORE, "1 signal bar",                                              "nv signalbar=1\nnotify NWINFO SIG_BAR"                              },
-    state_row{DATA_CARD | MODULE | UNI_CORE, "2 signal bars",                                             "nv signalbar=2\nnotify NWINFO SIG_BAR"                              },
-    state_row{DATA_CARD | MODULE | UNI_CORE, "3 signal bars",                                             "nv signalbar=3\nnotify NWINFO SIG_BAR"                              },
-    state_row{DATA_CARD | MODULE | UNI_CORE, "5 signal bars",                                             "nv signalbar=5\nnotify NWINFO SIG_BAR"                              },
-    state_row{EVERY,                         "data call up",                                              "nv q6_ppp_status=q6_ppp_connected\nnotify PPP PPP_STATUS 1"         },
+    state_row{EVERY_PRODUCT,                     "",                                                          "Network"                                                            },
+    state_row{EVERY_PRODUCT,                     "limited or no service",                                     "nv network_type=LIMITED_SERVICE_GSM\nnotify NWINFO NETTYPE"         },
+    state_row{EVERY_PRODUCT,                     "2G",                                                        "nv network_type=EDGE\nnotify NWINFO NETTYPE"                        },
+    state_row{EVERY_PRODUCT,                     "3G",                                                        "nv network_type=HSPA+\nnotify NWINFO NETTYPE"                       },
+    state_row{EVERY_PRODUCT,                     "5G",                                                        "nv network_type=SA\nnotify NWINFO NETTYPE"                          },
+    state_row{MODULE,                            "3G, roaming",
+              "nv network_type=HSPA+ simcard_roam=Roaming\nnotify NWINFO NETTYPE\nnotify NWINFO ROAMING_STATUS"                                                                    },
+    state_row{MODULE,                            "4G, roaming",                                               "nv simcard_roam=Roaming\nnotify NWINFO ROAMING_STATUS"              },
+    state_row{DATA_CARD | MODULE | UNI_CORE_CPE, "no signal bar",                                             "nv signalbar=0\nnotify NWINFO SIG_BAR"                              },
+    state_row{DATA_CARD | MODULE | UNI_CORE_CPE, "1 signal bar",                                              "nv signalbar=1\nnotify NWINFO SIG_BAR"                              },
+    state_row{DATA_CARD | MODULE | UNI_CORE_CPE, "2 signal bars",                                             "nv signalbar=2\nnotify NWINFO SIG_BAR"                              },
+    state_row{DATA_CARD | MODULE | UNI_CORE_CPE, "3 signal bars",                                             "nv signalbar=3\nnotify NWINFO SIG_BAR"                              },
+    state_row{DATA_CARD | MODULE | UNI_CORE_CPE, "5 signal bars",                                             "nv signalbar=5\nnotify NWINFO SIG_BAR"                              },
+    state_row{EVERY_PRODUCT,                     "data call up",                                              "nv q6_ppp_status=q6_ppp_connected\nnotify PPP PPP_STATUS 1"         },
 
-    state_row{WIFI,                          "",                                                          "Wi-Fi"                                                              },
-    state_row{WIFI,                          "off",                                                       "nv wifi_onoff_state=0\nnotify WLAN CURRENT_STATUS 0"                },
-    state_row{WPS,                           "WPS pairing",                                               "nv wifi_chip1_wps_state=1\nnotify WLAN AP_WPS_STATE 1"              },
+    state_row{WIFI,                              "",                                                          "Wi-Fi"                                                              },
+    state_row{WIFI,                              "off",                                                       "nv wifi_onoff_state=0\nnotify WLAN CURRENT_STATUS 0"                },
+    state_row{WPS,                               "WPS pairing",                                               "nv wifi_chip1_wps_state=1\nnotify WLAN AP_WPS_STATE 1"              },
 
-    state_row{UFI | MODULE | UNI_CORE,       "",                                                          "Messages and calls"                                                 },
-    state_row{UFI,                           "new message",                                               "nv sms_nvunread_count=1\nnotify SMS NEW_SMS"                        },
-    state_row{UFI,                           "new message, ten seconds later",                            "nv sms_nvunread_count=1\nnotify SMS NEW_SMS\nafter 10s"             },
-    state_row{UFI,                           "unread messages",                                           "nv sms_nvunread_count=1\nnotify SMS NV_UNREAD_SMS"                  },
-    state_row{UFI,                           "message store full",                                        "nv sms_nvtotal_count=100\nnotify SMS MEMORY_FULL"                   },
-    state_row{MODULE,                        "voicemail",                                                 "notify SMS VOCEMAIL_SET_FLAG 1"                                     },
-    state_row{MODULE | UNI_CORE,             "phone in use",                                              "notify VOICE \"PHONE LED ON\""                                      },
-    state_row{MODULE | UNI_CORE,             "phone rings",                                               "notify VOICE \"PHONE BLINK\""                                       },
+    state_row{UFI | MODULE | UNI_CORE_CPE,       "",                                                          "Messages and calls"                                                 },
+    state_row{UFI,                               "new message",                                               "nv sms_nvunread_count=1\nnotify SMS NEW_SMS"                        },
+    state_row{UFI,                               "new message, ten seconds later",                            "nv sms_nvunread_count=1\nnotify SMS NEW_SMS\nafter 10s"             },
+    state_row{UFI,                               "unread messages",                                           "nv sms_nvunread_count=1\nnotify SMS NV_UNREAD_SMS"                  },
+    state_row{UFI,                               "message store full",                                        "nv sms_nvtotal_count=100\nnotify SMS MEMORY_FULL"                   },
+    state_row{MODULE,                            "voicemail",                                                 "notify SMS VOCEMAIL_SET_FLAG 1"                                     },
+    state_row{MODULE | UNI_CORE_CPE,             "phone in use",                                              "notify VOICE \"PHONE LED ON\""                                      },
+    state_row{MODULE | UNI_CORE_CPE,             "phone rings",                                               "notify VOICE \"PHONE BLINK\""                                       },
 
-    state_row{EVERY,                         "",                                                          "Night, alarms and reminders"                                        },
-    state_row{EVERY,                         "night, dimmed",
+    state_row{EVERY_PRODUCT,                     "",                                                          "Night, alarms and reminders"                                        },
+    state_row{EVERY_PRODUCT,                     "night, dimmed",
               "nv night_mode_switch=1 night_mode_start_time=22:00 night_mode_end_time=06:30 syn_done=1\n"
-              "clock 23:00\ncommand NIGHT_MODE\nafter 20s"                                                                                                                     },
-    state_row{EVERY,                         "night, dark",
+              "clock 23:00\ncommand NIGHT_MODE\nafter 20s"                                                                                                                         },
+    state_row{EVERY_PRODUCT,                     "night, dark",
               "nv night_mode_switch=1 night_mode_start_time=22:00 night_mode_end_time=06:30 syn_done=1\n"
-              "nv night_mode_close_all_led=1\nclock 23:00\ncommand NIGHT_MODE\nafter 20s"                                                                                      },
-    state_row{EVERY,                         "too hot",                                                   "nv thermal_led_enable=60\nsensor 0 75\ncommand OVER_TEMP\nafter 20s"},
-    state_row{REMINDED,                      "allowance nearly used up: of seven seconds of a call, one",
+              "nv night_mode_close_all_led=1\nclock 23:00\ncommand NIGHT_MODE\nafter 20s"                                                                                          },
+    state_row{EVERY_PRODUCT,                     "too hot",                                                   "nv thermal_led_enable=60\nsensor 0 75\ncommand OVER_TEMP\nafter 20s"},
+    state_row{REMINDED,                          "allowance nearly used up: of seven seconds of a call, one",
               "nv data_volume_limit_switch=1 data_volume_limit_unit=data data_volume_limit_size=4_1024\n"
               "nv data_volume_alert_percent=75 monthly_tx_bytes=4294967296 monthly_rx_bytes=0\n"
-              "nv q6_ppp_status=q6_ppp_connected\nnotify PPP PPP_STATUS 1\nafter 12s"                                                                                          },
+              "nv q6_ppp_status=q6_ppp_connected\nnotify PPP PPP_STATUS 1\nafter 12s"                                                                                              },
 };
-
-unsigned mask_of(const product_name &product)
-{
-    for (const product_row &row : product_rows) {
-        if (row.name == product.name) {
-            return row.mask;
-        }
-    }
-    return 0;
-}
 
 std::string lit(const table_row &row)
 {
@@ -194,20 +165,15 @@ int play_state_apart(const product_name &product, const state_row &row, const da
 
 std::string switched_on(const product_name &product)
 {
-    const bool is_told = (mask_of(product) & POWERED) != 0;
+    const bool is_told = (product.mask & POWERED) != 0;
     return "product " + std::string(product.name) + "\n" + std::string(AT_REST) + "start\n" +
            std::string(is_told ? POWER_ON : "");
 }
 
 int play_table(const product_name &product, const daemon_options &options, std::vector<table_row> &rows)
 {
-    const unsigned mask = mask_of(product);
-    if (mask == 0) {
-        fprintf(stderr, "the table has no state of %s\n", std::string(product.name).c_str());
-        return PLAY_FAILED;
-    }
     for (const state_row &state : states) {
-        if (!(state.products & mask)) {
+        if (!(state.products & product.mask)) {
             continue;
         }
         table_row &row = rows.emplace_back();

@@ -1,17 +1,19 @@
 #include "evidence/commands.h"
 
+#include "evidence/from_log.h"
 #include "evidence/replay.h"
-#include "evidence/show.h"
 #include "evidence/story.h"
 #include "evidence/why.h"
 #include "language/names.h"
 
+#include <algorithm>
 #include <cstdio>
 #include <filesystem>
 
 namespace
 {
 constexpr int EXIT_UNREADABLE = 2;
+constexpr double LONGEST_S = 1e12;
 
 int refuse(const std::string &what)
 {
@@ -20,14 +22,14 @@ int refuse(const std::string &what)
 }
 } // namespace
 
-int show_command(const evidence_options &options)
+int show_command(const evidence_options &options, std::vector<shown_step> &steps)
 {
     recording trace;
     std::string error;
     if (!load_recording(options.file, trace, error)) {
         return refuse(error);
     }
-    show_recording(trace, {.every_request = options.all_requests}, stdout);
+    steps = show_recording(trace, {.every_request = options.all_requests}, stdout);
     return 0;
 }
 
@@ -45,17 +47,18 @@ int story_command(const evidence_options &options)
 int why_command(const evidence_options &options)
 {
     recording trace;
+    log_history log;
     std::string error;
     const std::optional<int> led = find_led(options.led);
     if (!led) {
         return refuse("unknown LED '" + options.led + "'; LEDs are " + led_names());
     }
-    if (!load_recording(options.file, trace, error)) {
+    if (!(options.from_log ? load_log(options.file, log, error) : load_recording(options.file, trace, error))) {
         return refuse(error);
     }
-    const history told = history_of(trace);
-    const size_t until =
-        options.at_s < 0 ? trace.entries.size() : entry_after(trace, static_cast<int64_t>(options.at_s * 1'000'000));
+    const history told = options.from_log ? std::move(log.told) : history_of(trace);
+    const auto at_us = static_cast<int64_t>(std::min(options.at_s, LONGEST_S) * 1'000'000);
+    const size_t until = options.at_s < 0 ? told.trace->entries.size() : entry_after(*told.trace, at_us);
     fputs((options.always ? why_always(told, *led) : why(told, *led, until)).c_str(), stdout);
     return 0;
 }

@@ -1,6 +1,7 @@
 // The commands of kiv_led_sim that read evidence.
 #pragma once
 
+#include "evidence/show.h"
 #include "world/daemon_process.h"
 
 #include <string>
@@ -17,7 +18,7 @@ struct evidence_options {
 };
 
 // Each returns the exit code: 0, or 2 when the file or the LED's name cannot be read.
-int show_command(const evidence_options &options);
+int show_command(const evidence_options &options, std::vector<shown_step> &steps);
 int story_command(const evidence_options &options);
 int why_command(const evidence_options &options);
 int replay_command(const evidence_options &options, daemon_options daemon); // 1: the daemon does something else

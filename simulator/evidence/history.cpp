@@ -78,11 +78,16 @@ void take(reading &in, const trace_entry &entry, size_t at)
     }
 }
 
+std::string timer_name(const history &told, int64_t handle)
+{
+    return told.from_log ? told.timer_names[static_cast<size_t>(handle) - 1] : "timer " + std::to_string(handle);
+}
+
 std::string started_by(const history &told, const activity &doing)
 {
     const activity &other = told.activities[doing.asked_in];
     if (other.what == cause::TIMER) {
-        return "timer " + std::to_string(other.timer);
+        return timer_name(told, other.timer);
     }
     return other.what == cause::OWN_RELIGHT ? "command RELIGHT" : describe(told, doing.asked_in);
 }
@@ -90,9 +95,9 @@ std::string started_by(const history &told, const activity &doing)
 std::string describe_timer(const history &told, const activity &doing)
 {
     const trace_entry &start = told.trace->entries[doing.asked_for];
-    std::string text = "timer " + std::to_string(doing.timer);
-    if (told.from_log || start.call != "kiv_timer") {
-        return told.from_log ? "a timer" : text + ", started before the trace begins";
+    std::string text = timer_name(told, doing.timer);
+    if (start.call != "kiv_timer") {
+        return text + (told.from_log ? "" : ", started before the trace begins");
     }
     const std::string ms = start.arguments.substr(0, start.arguments.find(','));
     const bool repeats = start.arguments.ends_with("repeat");
@@ -147,7 +152,7 @@ std::string describe(const history &told, size_t activity_index)
         return "start-up";
     case cause::MESSAGE: {
         const std::string text = shortened(stimulus_of(entry));
-        return text.empty() ? "a receive that failed" : text;
+        return !text.empty() ? text : told.from_log ? "a message that it does not name" : "a receive that failed";
     }
     case cause::OWN_RELIGHT:
         return describe_relight(told, doing);
@@ -157,6 +162,9 @@ std::string describe(const history &told, size_t activity_index)
         return stimulus_of(entry);
     case cause::THREAD:
         break;
+    }
+    if (told.from_log) {
+        return entry.call == "kiv_trace" ? "start-up" : "what had begun before the log does";
     }
     return "start-up, in thread " + entry.thread;
 }

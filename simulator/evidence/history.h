@@ -25,8 +25,9 @@ struct led_change {
 
 struct history {
     const recording *trace = nullptr;
-    bool from_log = false;            // a log's lines: times are line numbers, brightness and blink times unknown
-    std::vector<std::string> moments; // of a log: what each line says of its time
+    bool from_log = false;                // times are line numbers, brightness and blink times unknown
+    std::vector<std::string> moments;     // of a log, by entry: the line, and what it says of its time
+    std::vector<std::string> timer_names; // of a log, by handle from 1 on
     std::vector<activity> activities;
     std::vector<size_t> activity_of; // by entry
 };

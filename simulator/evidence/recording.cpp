@@ -64,10 +64,9 @@ bool parse_recording(std::string_view text, const std::string &name, recording &
     return !out.entries.empty();
 }
 
-bool load_recording(const std::string &path, recording &out, std::string &error)
+bool read_evidence(const std::string &path, std::string &text, std::string &error)
 {
     std::error_code failure;
-    std::string text;
     if (!std::filesystem::is_regular_file(path, failure) || !read_file(path, text)) {
         error = path + ": cannot be read";
         return false;
@@ -76,5 +75,11 @@ bool load_recording(const std::string &path, recording &out, std::string &error)
         error = path + ": larger than 64 MiB; cut out the part that matters";
         return false;
     }
-    return parse_recording(text, path, out, error);
+    return true;
+}
+
+bool load_recording(const std::string &path, recording &out, std::string &error)
+{
+    std::string text;
+    return read_evidence(path, text, error) && parse_recording(text, path, out, error);
 }

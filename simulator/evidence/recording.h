@@ -13,6 +13,7 @@ struct recording {
 
 // False with "FILE:LINE: what is wrong": a line that no trace has, lines out of order, nothing at all.
 bool parse_recording(std::string_view text, const std::string &name, recording &out, std::string &error);
+bool read_evidence(const std::string &path, std::string &text, std::string &error);
 bool load_recording(const std::string &path, recording &out, std::string &error);
 
 // The line with which a process begins, when its trace has one.

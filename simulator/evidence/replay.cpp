@@ -1,6 +1,7 @@
 #include "evidence/replay.h"
 
 #include "evidence/replay_protocol.h"
+#include "world/device.h"
 
 #include <array>
 #include <cerrno>
@@ -34,7 +35,7 @@ struct stage {
     const replay_options &options;
     std::string preload;
     std::string folder; // of links: every library of the device is the replay
-    replay_status *status = nullptr;
+    replay_page *page = nullptr;
 };
 
 bool refuse(const recording &trace, size_t at, const std::string &why, std::string &report)
@@ -90,36 +91,46 @@ bool set_up_stage(stage &s, std::string &report)
 {
     std::error_code failure;
     s.preload = find_library(s.options.process.daemon);
-    s.folder = (fs::temp_directory_path(failure) / "kiv_replay_XXXXXX").string();
-    if (s.preload.empty() || !mkdtemp(s.folder.data())) {
-        report += s.preload.empty() ? std::string(REPLAY_FILE) + " is neither in lib/ nor in ../lib/kiv_led\n"
-                                    : s.folder + ": " + strerror(errno) + "\n";
+    std::string error = std::string(REPLAY_FILE) + " is neither in lib/ nor in ../lib/kiv_led";
+    s.folder = s.preload.empty() ? "" : make_device(error);
+    if (s.folder.empty()) {
+        report += error + "\n";
         return false;
     }
     for (const char *name : DEVICE_LIBRARIES) {
         fs::create_symlink(s.preload, fs::path(s.folder) / name, failure);
     }
-    const int fd = open((s.folder + "/status").c_str(), O_RDWR | O_CREAT | O_CLOEXEC, 0600);
-    const bool sized = fd >= 0 && ftruncate(fd, sizeof(replay_status)) == 0;
-    void *page = sized ? mmap(nullptr, sizeof(replay_status), PROT_READ | PROT_WRITE, MAP_SHARED, fd, 0) : MAP_FAILED;
-    s.status = page == MAP_FAILED ? nullptr : static_cast<replay_status *>(page);
+    const int fd = open((s.folder + "/page").c_str(), O_RDWR | O_CREAT | O_CLOEXEC, 0600);
+    const bool sized = fd >= 0 && ftruncate(fd, sizeof(replay_page)) == 0;
+    void *page = sized ? mmap(nullptr, sizeof(replay_page), PROT_READ | PROT_WRITE, MAP_SHARED, fd, 0) : MAP_FAILED;
+    s.page = page == MAP_FAILED ? nullptr : static_cast<replay_page *>(page);
     if (fd >= 0) {
         close(fd);
     }
-    report += s.status ? "" : s.folder + "/status cannot be made\n";
-    return s.status != nullptr;
+    report += s.page ? "" : s.folder + "/page cannot be made\n";
+    return s.page != nullptr;
 }
 
 void take_down_stage(stage &s)
 {
-    std::error_code failure;
-    if (s.status) {
-        munmap(s.status, sizeof *s.status);
+    if (s.page) {
+        munmap(s.page, sizeof *s.page);
     }
-    fs::remove_all(s.folder, failure);
+    remove_device(s.folder);
 }
 
-[[noreturn]] void become_daemon(const stage &s, size_t from, size_t to)
+void give_orders(const stage &s, size_t from, size_t to)
+{
+    const std::string out = s.options.out_path.empty() ? "" : fs::absolute(s.options.out_path).string();
+    *s.page = {};
+    snprintf(s.page->trace, sizeof s.page->trace, "%s", fs::absolute(s.trace.name).c_str());
+    snprintf(s.page->out, sizeof s.page->out, "%s", out.c_str());
+    s.page->lines = s.options.lines;
+    s.page->line = from;
+    s.page->end = to;
+}
+
+[[noreturn]] void become_daemon(const stage &s)
 {
     const int nowhere = open("/dev/null", O_RDWR | O_CLOEXEC);
     dup2(nowhere, STDIN_FILENO);
@@ -128,16 +139,7 @@ void take_down_stage(stage &s)
     setenv("LD_LIBRARY_PATH", s.folder.c_str(), 1);
     setenv("ASAN_OPTIONS", "verify_asan_link_order=0", 0);
     setenv("TZ", "UTC", 1);
-    setenv(REPLAY_TRACE_VARIABLE, fs::absolute(s.trace.name).c_str(), 1);
-    setenv(REPLAY_FROM_VARIABLE, std::to_string(from).c_str(), 1);
-    setenv(REPLAY_TO_VARIABLE, std::to_string(to).c_str(), 1);
-    setenv(REPLAY_STATUS_VARIABLE, (s.folder + "/status").c_str(), 1);
-    if (!s.options.out_path.empty()) {
-        setenv(REPLAY_OUT_VARIABLE, fs::absolute(s.options.out_path).c_str(), 1);
-    }
-    if (s.options.lines) {
-        setenv(REPLAY_LINES_VARIABLE, "1", 1);
-    }
+    setenv(REPLAY_VARIABLE, (s.folder + "/page").c_str(), 1);
     execl(s.options.process.daemon.c_str(), s.options.process.daemon.c_str(), nullptr);
     dprintf(STDERR_FILENO, "%s: %s\n", s.options.process.daemon.c_str(), strerror(errno));
     _exit(127);
@@ -147,12 +149,12 @@ void take_down_stage(stage &s)
 bool wait_for_end(const stage &s, pid_t pid, int &wait_status)
 {
     const int watched = static_cast<int>(syscall(SYS_pidfd_open, pid, 0));
-    unsigned long line = s.status->line;
+    size_t line = s.page->line;
     int quiet_ms = 0;
     pollfd end = {watched, POLLIN, 0};
     while (poll(&end, 1, LOOK_AGAIN_MS) == 0 && quiet_ms < STUCK_AFTER_MS) {
-        quiet_ms = s.status->line == line ? quiet_ms + LOOK_AGAIN_MS : 0;
-        line = s.status->line;
+        quiet_ms = s.page->line == line ? quiet_ms + LOOK_AGAIN_MS : 0;
+        line = s.page->line;
     }
     kill(pid, SIGKILL);
     waitpid(pid, &wait_status, 0);
@@ -168,7 +170,7 @@ std::string describe_end(int wait_status)
 
 void report_difference(const stage &s, const std::string &done, std::string &report)
 {
-    const size_t at = std::min<size_t>(s.status->line, s.trace.entries.size() - 1);
+    const size_t at = std::min<size_t>(s.page->line, s.trace.entries.size() - 1);
     report += s.trace.name + ":" + std::to_string(at + 1) + ": differs\n";
     for (size_t line = at - std::min(at, LINES_BEFORE); line < at; line++) {
         report += "    " + s.trace.entries[line].line + "\n";
@@ -179,27 +181,26 @@ void report_difference(const stage &s, const std::string &done, std::string &rep
 
 replay_result replay_process(stage &s, size_t from, size_t to, std::string &report)
 {
-    *s.status = {};
-    s.status->line = from;
+    give_orders(s, from, to);
     const pid_t pid = fork();
     int wait_status = 0;
     if (pid == 0) {
-        become_daemon(s, from, to);
+        become_daemon(s);
     }
     const bool ended = pid > 0 && wait_for_end(s, pid, wait_status);
-    s.status->done[sizeof s.status->done - 1] = '\0';
-    switch (s.status->verdict) {
+    s.page->done[sizeof s.page->done - 1] = '\0';
+    switch (s.page->verdict) {
     case REPLAY_SAME:
-        if (s.status->done[0]) {
+        if (s.page->done[0]) {
             report +=
-                "the recording ends in the middle of it; the daemon goes on with " + std::string(s.status->done) + "\n";
+                "the recording ends in the middle of it; the daemon goes on with " + std::string(s.page->done) + "\n";
         }
         return REPLAYED_SAME;
     case REPLAY_UNREADABLE:
-        report += std::string(s.status->done) + "\n";
+        report += std::string(s.page->done) + "\n";
         return REPLAY_IMPOSSIBLE;
     case REPLAY_DIFFERS:
-        report_difference(s, s.status->done, report);
+        report_difference(s, s.page->done, report);
         return REPLAYED_DIFFERENT;
     default:
         report_difference(s, ended ? describe_end(wait_status) : "nothing for a minute: the daemon makes no call",

@@ -1,17 +1,21 @@
-// What kiv_led_sim and the replay in the daemon's process share: variables, and a page of memory in a file.
+// What kiv_led_sim and the replay in the daemon's process share: a page of memory in a file.
 #pragma once
 
-constexpr const char *REPLAY_TRACE_VARIABLE = "KIV_REPLAY";         // the recording
-constexpr const char *REPLAY_FROM_VARIABLE = "KIV_REPLAY_FROM";     // the first line of this process, from 0
-constexpr const char *REPLAY_TO_VARIABLE = "KIV_REPLAY_TO";         // the line behind its last
-constexpr const char *REPLAY_STATUS_VARIABLE = "KIV_REPLAY_STATUS"; // the file with a replay_status
-constexpr const char *REPLAY_OUT_VARIABLE = "KIV_REPLAY_OUT";       // where the replay's own trace goes, if anywhere
-constexpr const char *REPLAY_LINES_VARIABLE = "KIV_REPLAY_LINES";   // set: line numbers of the log count
+#include <climits>
+#include <cstddef>
+
+constexpr const char *REPLAY_VARIABLE = "KIV_REPLAY"; // names the file
 
 enum replay_verdict { REPLAY_GOES_ON = 0, REPLAY_SAME, REPLAY_DIFFERS, REPLAY_UNREADABLE };
 
-struct replay_status {
+struct replay_page {
+    // What is to be done.
+    char trace[PATH_MAX]; // the recording
+    char out[PATH_MAX];   // where the replay's own trace goes; empty: nowhere
+    size_t end;           // the line behind the last one of this process
+    bool lines;           // line numbers of the log count
+    // How it goes.
+    size_t line; // the next line of the recording, from 0; at the beginning the first one of this process
     int verdict;
-    unsigned long line; // the next line of the recording
-    char done[9000];    // what the daemon does there; after REPLAY_SAME what it would go on with, if anything
+    char done[9000]; // what the daemon does there; after REPLAY_SAME what it would go on with, if anything
 };

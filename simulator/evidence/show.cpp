@@ -1,7 +1,8 @@
 #include "evidence/show.h"
 
 #include "evidence/statements.h"
-#include "seen/timeline.h"
+
+#include <utility>
 
 namespace
 {
@@ -13,11 +14,21 @@ bool begins_process(const recording &trace, size_t at)
     return at == 0 || is_head(trace.entries[at]);
 }
 
-void put_stimulus(timeline &line, observed &state, const trace_entry &entry, const std::string &text)
+void end_step(timeline &line, const observed &state, std::vector<shown_step> &steps)
 {
     timeline_flush(line, state);
-    timeline_stimulus(line, entry.time_us, shortened(text));
+    if (!steps.empty()) {
+        steps.back().changes = std::move(line.changes);
+    }
+    line.changes.clear();
+    line.requests.clear();
+}
+
+void put_stimulus(timeline &line, const trace_entry &entry, const std::string &text, std::vector<shown_step> &steps)
+{
+    timeline_stimulus(line, entry.time_us, text);
     line.moment_us = entry.time_us;
+    steps.push_back({.time_us = entry.time_us, .stimulus = text, .changes = {}});
 }
 
 // What stands in the timeline for an entry; empty for most.
@@ -32,10 +43,11 @@ std::string text_for(const recording &trace, size_t at, int64_t begun_us)
 }
 } // namespace
 
-void show_recording(const recording &trace, const show_options &options, FILE *out)
+std::vector<shown_step> show_recording(const recording &trace, const show_options &options, FILE *out)
 {
     timeline line;
     observed state;
+    std::vector<shown_step> steps;
     int64_t begun_us = 0;
     line.out = out;
     line.every_request = options.every_request;
@@ -45,13 +57,15 @@ void show_recording(const recording &trace, const show_options &options, FILE *o
         begun_us = begins_process(trace, at) ? entry.time_us : begun_us;
         const std::string text = text_for(trace, at, begun_us);
         if (!text.empty()) {
-            put_stimulus(line, state, entry, text);
+            end_step(line, state, steps);
+            put_stimulus(line, entry, shortened(text), steps);
             state.step.clear();
         }
         timeline_entry(line, state, entry);
         observe(state, entry);
     }
-    timeline_flush(line, state);
+    end_step(line, state, steps);
     fprintf(out, "%zu lines%s, to %s\n", trace.entries.size(), trace.cut ? " and half a one" : "",
             moment(trace.entries.back().time_us).c_str());
+    return steps;
 }

@@ -2,6 +2,7 @@
 #pragma once
 
 #include "evidence/recording.h"
+#include "seen/timeline.h"
 
 #include <cstdio>
 
@@ -9,4 +10,11 @@ struct show_options {
     bool every_request = false;
 };
 
-void show_recording(const recording &trace, const show_options &options, FILE *out);
+// What set the daemon to work, and what its LEDs did then.
+struct shown_step {
+    int64_t time_us = 0;
+    std::string stimulus;
+    std::vector<led_event> changes;
+};
+
+std::vector<shown_step> show_recording(const recording &trace, const show_options &options, FILE *out);

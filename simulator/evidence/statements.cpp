@@ -5,6 +5,7 @@
 #include "language/names.h"
 #include "language/words.h"
 
+#include <algorithm>
 #include <array>
 #include <cstdio>
 #include <cstring>
@@ -164,21 +165,33 @@ std::string register_statement(const message_head &head)
 
 std::string scenario_word(const std::string &text)
 {
-    if (!text.empty() && text.find_first_not_of(PLAIN) == std::string::npos) {
-        return text;
-    }
-    std::string quoted = "\"";
+    const bool plain = !text.empty() && text.find_first_not_of(PLAIN) == std::string::npos;
+    return plain ? text : quoted(text);
+}
+
+std::string quoted(const std::string &text)
+{
+    std::string words = "\"";
     for (const char c : text) {
         const auto byte = static_cast<unsigned char>(c);
         const bool printable = byte >= 0x20 && byte < 0x7f && c != '"' && c != '\\';
-        quoted += printable ? std::string(1, c) : "\\x" + hex(std::string(1, c));
+        words += printable ? std::string(1, c) : "\\x" + hex(std::string(1, c));
     }
-    return quoted + "\"";
+    return words + "\"";
+}
+
+std::string printable(std::string_view text)
+{
+    std::string shown(text);
+    std::replace_if(
+        shown.begin(), shown.end(), [](char c) { return (c >= 0 && c < ' ') || c == 0x7f; }, '?');
+    return shown;
 }
 
 std::string shortened(const std::string &text)
 {
-    return text.size() <= SHORT_ENOUGH ? text : text.substr(0, SHORT_ENOUGH) + " ...";
+    const std::string shown = printable(text);
+    return shown.size() <= SHORT_ENOUGH ? shown : shown.substr(0, SHORT_ENOUGH) + " ...";
 }
 
 std::optional<std::string> received_message(const trace_entry &entry)

@@ -19,4 +19,7 @@ bool is_own_relight(const trace_entry &entry);
 // A word of a scenario: in quotes and with escapes where it needs them.
 std::string scenario_word(const std::string &text);
 
-std::string shortened(const std::string &text); // to what fits on a line
+std::string quoted(const std::string &text); // always
+
+std::string printable(std::string_view text);   // without bytes that a terminal would act upon
+std::string shortened(const std::string &text); // printable, to what fits on a line

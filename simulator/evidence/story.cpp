@@ -1,38 +1,29 @@
 #include "evidence/story.h"
 
 #include "evidence/statements.h"
+#include "evidence/told_device.h"
 #include "kiv/socket.h"
 #include "language/words.h"
 #include "seen/observed.h"
 
 #include <algorithm>
 #include <array>
-#include <chrono>
 #include <cstdio>
-#include <cstdlib>
 #include <cstring>
 #include <map>
 
 namespace
 {
 constexpr int64_t US_PER_MS = 1000;
-constexpr int64_t US_PER_S = 1'000'000;
 constexpr int64_t LATE_US = 20'000; // as late as a device's timer may be
-constexpr const char *MISSING = "missing";
-
-// A value of the device as a statement sets it: "nv battery_value=", "sensor 3 ".
-struct setting {
-    std::string statement;
-    std::string value;
-};
 
 struct telling {
+    explicit telling(const recording &of) : trace(of) {}
     const recording &trace;
     std::string text;
-    std::map<std::string, std::string> device; // values, by statement, as the scenario has left them
-    int64_t now_us = 0;                        // of the scenario
-    int64_t wall_offset_us = INT64_MIN;        // the wall clock at time 0, once it is known
-    int64_t relights = 0;                      // on their way
+    told_device device;
+    int64_t now_us = 0;   // of the scenario
+    int64_t relights = 0; // on their way
     bool runs = false;
     std::map<int, std::array<uint32_t, 4>> registered; // masks, by module
     bool exact = true;                                 // virtual time, whose moments are full milliseconds
@@ -43,173 +34,6 @@ struct telling {
 void say(telling &in, const std::string &statement)
 {
     in.text += statement + "\n";
-}
-
-std::string scenario_text(const std::string &text)
-{
-    return text == MISSING ? "\"missing\"" : scenario_word(text);
-}
-
-std::string answer_numbers(const trace_entry &entry)
-{
-    return entry.result.starts_with("0, ") ? entry.result.substr(3) : MISSING;
-}
-
-std::string answer_text(const trace_entry &entry)
-{
-    const size_t text = entry.result.find('"');
-    return text == std::string::npos ? MISSING : scenario_text(quoted_texts(entry.result)[0]);
-}
-
-// What an entry says of the device that a scenario can set. None when it says nothing.
-std::optional<setting> setting_of(const trace_entry &entry)
-{
-    const std::vector<std::string> texts = quoted_texts(entry.arguments);
-    if (entry.call == "kiv_nvconfig_read" && !texts.empty()) {
-        return setting{"nv " + texts[0] + "=", answer_text(entry)};
-    }
-    if (entry.call == "kiv_cfg_get_item") {
-        const std::string item = entry.arguments.substr(0, entry.arguments.find(','));
-        const size_t behind = entry.result.find(", ");
-        if (behind == std::string::npos) {
-            return setting{"cfg " + item + " ", MISSING};
-        }
-        const bool text = entry.result.find('"') != std::string::npos;
-        return setting{"cfg " + item + "=", text ? answer_text(entry) : entry.result.substr(behind + 2)};
-    }
-    if (entry.call == "kiv_bsp_get_sensor_temp_sync") {
-        return setting{"sensor " + entry.arguments + " ", answer_numbers(entry)};
-    }
-    if (entry.call == "kiv_bsp_get_charger_connect_status_sync") {
-        return setting{"charger ", answer_numbers(entry)};
-    }
-    if (entry.call == "kiv_bsp_get_battery_online_status_sync") {
-        return setting{"battery ", answer_numbers(entry)};
-    }
-    if (entry.call == "open" && entry.result.starts_with("-")) {
-        return setting{"sys led:rolling_leds ", MISSING};
-    }
-    if (entry.call == "read") {
-        const std::vector<std::string> told = quoted_texts(entry.result);
-        return setting{"sys led:rolling_leds ", told.empty() ? MISSING : std::to_string(atoi(told[0].c_str()))};
-    }
-    return std::nullopt;
-}
-
-std::string initial(const std::string &statement)
-{
-    return statement == "cfg 531=" ? "1" : MISSING;
-}
-
-std::string value_in(const telling &in, const std::string &statement)
-{
-    const auto known = in.device.find(statement);
-    return known == in.device.end() ? initial(statement) : known->second;
-}
-
-// A result that is a failure and not an answer of the device's own.
-bool is_fault(const trace_entry &entry)
-{
-    constexpr std::array reads = {"kiv_nvconfig_read",
-                                  "kiv_bsp_get_sensor_temp_sync",
-                                  "kiv_cfg_get_item",
-                                  "system",
-                                  "kiv_bsp_get_charger_connect_status_sync",
-                                  "kiv_bsp_get_battery_online_status_sync",
-                                  "open",
-                                  "read",
-                                  "time",
-                                  "pthread_self",
-                                  "pthread_create"};
-    if (entry.result.empty() || std::find(reads.begin(), reads.end(), entry.call) != reads.end()) {
-        return false;
-    }
-    if (entry.call == "kiv_timer") {
-        return entry.result == "0";
-    }
-    return entry.call == "kiv_reg_proc" ? entry.result != "1" : entry.result[0] == '-';
-}
-
-// What the wall clock must show at a moment, so that an entry finds what it found. None when it does anyhow; by how
-// much of a second it was past the full one, nobody knows.
-std::optional<int64_t> clock_for(const telling &in, const trace_entry &entry, int64_t moment_us)
-{
-    if (entry.call != "time") {
-        return std::nullopt;
-    }
-    const int64_t found_s = parse_number(entry.result, 0, INT64_MAX / US_PER_S).value_or(0);
-    const int64_t shown_s = (in.wall_offset_us + entry.time_us) / US_PER_S;
-    if (in.wall_offset_us != INT64_MIN && std::abs(found_s - shown_s) <= 1) {
-        return std::nullopt;
-    }
-    return found_s - (entry.time_us - moment_us) / US_PER_S;
-}
-
-std::string clock_statement(int64_t seconds)
-{
-    const std::chrono::sys_seconds moment{std::chrono::seconds(seconds)};
-    const auto day = std::chrono::floor<std::chrono::days>(moment);
-    const std::chrono::year_month_day date(day);
-    const int64_t of_day = (moment - day).count();
-    std::array<char, 64> text;
-    snprintf(text.data(), text.size(), "clock %04d-%02u-%02u %02lld:%02lld:%02lld", static_cast<int>(date.year()),
-             static_cast<unsigned>(date.month()), static_cast<unsigned>(date.day()),
-             static_cast<long long>(of_day / 3600), static_cast<long long>(of_day / 60 % 60),
-             static_cast<long long>(of_day % 60));
-    return text.data();
-}
-
-std::string statement_of(const setting &one)
-{
-    for (const product_name &product : all_products()) {
-        if (one.statement == "cfg 6000=" && one.value == product.cfg_text) {
-            return "product " + std::string(product.name);
-        }
-    }
-    return one.statement + one.value;
-}
-
-// Everything that the entries from..to read is set as they read it; the first reading counts.
-void set_device(telling &in, size_t from, size_t to, int64_t now_us)
-{
-    std::map<std::string, int> faults;
-    std::vector<std::string> seen;
-    for (size_t at = from; at < to; at++) {
-        const trace_entry &entry = in.trace.entries[at];
-        if (is_fault(entry)) {
-            const std::string match = entry.arguments.substr(0, entry.arguments.find('\''));
-            faults["fail " + entry.call + " " + scenario_word(match.empty() ? "*" : match) + " " +
-                   entry.result.substr(0, entry.result.find(','))]++;
-        }
-        if (const auto seconds = clock_for(in, entry, now_us)) {
-            say(in, clock_statement(*seconds));
-            in.wall_offset_us = *seconds * US_PER_S - now_us;
-        }
-        const std::optional<setting> read = setting_of(entry);
-        if (!read || std::find(seen.begin(), seen.end(), read->statement) != seen.end()) {
-            continue;
-        }
-        seen.push_back(read->statement);
-        if (value_in(in, read->statement) != read->value) {
-            say(in, statement_of(*read));
-            in.device[read->statement] = read->value;
-        }
-    }
-    for (const auto &[statement, times] : faults) {
-        say(in, statement + " " + std::to_string(times));
-    }
-}
-
-// What the daemon itself does to the device.
-void take_effect(telling &in, const trace_entry &entry)
-{
-    const std::vector<std::string> texts = quoted_texts(entry.arguments);
-    if (entry.call == "kiv_nvconfig_write" && entry.result == "0" && texts.size() == 2) {
-        in.device["nv " + texts[0] + "="] = scenario_text(texts[1]);
-    }
-    if (entry.call == "system" && !texts.empty() && texts[0].find("rolling_leds") != std::string::npos) {
-        in.device["sys led:rolling_leds "] = "1";
-    }
 }
 
 bool shows_something(const recording &trace, size_t from, size_t to)
@@ -227,7 +51,7 @@ void observe_all(telling &in, size_t from, size_t to)
     begin_step(in.state);
     for (size_t at = from; at < to; at++) {
         observe(in.state, in.trace.entries[at]);
-        take_effect(in, in.trace.entries[at]);
+        take_effect(in.device, in.trace.entries[at]);
     }
 }
 
@@ -309,15 +133,6 @@ std::string step_at(telling &in, size_t at)
     return bytes->empty() ? "" : heard_or_not(in, message_statement(*bytes), *bytes);
 }
 
-// Whether the entries from..to need the device to be otherwise than it is now.
-bool needs_setting(telling &in, size_t from, size_t to)
-{
-    telling tried = in;
-    tried.text.clear();
-    set_device(tried, from, to, in.trace.entries[from].time_us);
-    return !tried.text.empty();
-}
-
 // Behind what belongs to the moment of the entry from: in virtual time what happens in the same one, on a device what
 // nobody has waited for.
 size_t end_of_moment(const telling &in, size_t from, size_t end)
@@ -347,14 +162,16 @@ void tell_time(telling &in, size_t from, size_t end)
     while (from < end) {
         const size_t behind = end_of_moment(in, from, end);
         const int64_t moment_us = in.trace.entries[from].time_us;
-        if (needs_setting(in, from, behind) && moment_us - US_PER_MS > in.now_us) {
+        told_device tried = in.device;
+        const bool changed = !settings_for(tried, in.trace, from, behind, moment_us).empty();
+        if (changed && moment_us - US_PER_MS > in.now_us) {
             pass_time(in, moment_us - US_PER_MS);
             expect(in, told, from);
             told = from;
         }
-        set_device(in, from, behind, in.now_us);
+        in.text += settings_for(in.device, in.trace, from, behind, in.now_us);
         for (size_t at = from; at < behind; at++) {
-            take_effect(in, in.trace.entries[at]);
+            take_effect(in.device, in.trace.entries[at]);
         }
         from = behind;
     }
@@ -374,7 +191,7 @@ void tell_step(telling &in, const std::string &statement, size_t from, size_t en
 {
     const size_t at_once = end_of_moment(in, from, end);
     pass_time(in, in.trace.entries[from].time_us);
-    set_device(in, from, at_once, in.now_us);
+    in.text += settings_for(in.device, in.trace, from, at_once, in.now_us);
     say(in, statement);
     in.runs = true;
     expect(in, from, at_once);
@@ -398,7 +215,8 @@ std::string opening(const recording &trace)
 
 std::string story_of(const recording &trace)
 {
-    telling in = {.trace = trace, .text = opening(trace), .device = {}, .registered = {}, .wakes = {}, .state = {}};
+    telling in(trace);
+    in.text = opening(trace);
     in.now_us = trace.entries[0].time_us;
     in.exact = std::all_of(trace.entries.begin(), trace.entries.end(),
                            [](const trace_entry &entry) { return entry.time_us % US_PER_MS == 0; });

@@ -1,6 +1,7 @@
 #include "evidence/why.h"
 
 #include "evidence/drops.h"
+#include "evidence/from_log.h"
 #include "evidence/statements.h"
 
 #include <algorithm>
@@ -31,38 +32,14 @@ std::string look_text(const history &told, const led_look &look)
     if (!told.from_log) {
         return describe(look);
     }
-    return look.mode == led_mode::OFF ? "off" : look.mode == led_mode::ON ? "on" : "blink";
+    const std::string dimmed = look.brightness == 1 ? ", dimmed" : "";
+    return look.mode == led_mode::OFF ? "off" : (look.mode == led_mode::ON ? "on" : "blink") + dimmed;
 }
 
 std::string group_of(int led)
 {
     const std::string_view name = led_name(led);
     return std::string(name.substr(0, name.find('_')));
-}
-
-bool is_about_group(const trace_entry &entry, int led)
-{
-    const std::optional<led_wanted> request = led_request_of(entry);
-    return request && group_of(request->led) == group_of(led);
-}
-
-// The entries of the activity from behind the last request for another group's LED up to the request. What is read and
-// decided for an LED stands there.
-std::vector<size_t> way_to(const history &told, const led_change &change, int led)
-{
-    std::vector<size_t> way;
-    for (size_t at = change.request + 1; at-- > told.activities[change.in].entry;) {
-        const trace_entry &entry = told.trace->entries[at];
-        if (told.activity_of[at] != change.in) {
-            continue;
-        }
-        if (entry.call == "kiv_bsp_set_leds_sync" && !is_about_group(entry, led)) {
-            break;
-        }
-        way.push_back(at);
-    }
-    std::reverse(way.begin(), way.end());
-    return way;
 }
 
 // A scene decides once for all its LEDs.
@@ -74,6 +51,21 @@ std::vector<size_t> all_before(const history &told, const led_change &change)
             way.push_back(at);
         }
     }
+    return way;
+}
+
+// The entries of the activity from behind the last request for another group's LED up to the request. What is read and
+// decided for an LED stands there.
+std::vector<size_t> way_to(const history &told, const led_change &change, int led)
+{
+    std::vector<size_t> way = all_before(told, change);
+    const auto last = std::find_if(way.rbegin(), way.rend(), [&](size_t at) {
+        const trace_entry &entry = told.trace->entries[at];
+        const std::optional<led_wanted> request = led_request_of(entry);
+        return entry.call == "kiv_bsp_set_leds_sync" && !(request && group_of(request->led) == group_of(led));
+    });
+    way.erase(way.begin(), last.base());
+    way.push_back(change.request);
     return way;
 }
 
@@ -90,18 +82,6 @@ std::string value_read(const trace_entry &entry)
     return {};
 }
 
-lines values_on(const history &told, const std::vector<size_t> &way)
-{
-    lines values;
-    for (const size_t at : way) {
-        const std::string value = value_read(told.trace->entries[at]);
-        if (!value.empty() && std::find(values.begin(), values.end(), value) == values.end()) {
-            values.push_back(value);
-        }
-    }
-    return values;
-}
-
 // What every message and every request logs says nothing about this one.
 bool is_routine(const std::string &text)
 {
@@ -114,16 +94,23 @@ bool is_routine(const std::string &text)
            });
 }
 
-lines decisions_on(const history &told, const std::vector<size_t> &way)
+std::string decision(const trace_entry &entry)
 {
-    lines decisions;
+    const std::string text = log_text(entry);
+    return is_routine(text) ? "" : shortened(text);
+}
+
+// What the entries on the way tell, each thing once.
+lines told_on(const history &told, const std::vector<size_t> &way, std::string (*tell)(const trace_entry &))
+{
+    lines texts;
     for (const size_t at : way) {
-        const std::string text = log_text(told.trace->entries[at]);
-        if (!is_routine(text)) {
-            decisions.push_back(shortened(text));
+        const std::string text = tell(told.trace->entries[at]);
+        if (!text.empty() && std::find(texts.begin(), texts.end(), text) == texts.end()) {
+            texts.push_back(text);
         }
     }
-    return decisions;
+    return texts;
 }
 
 // Since when it is night, and who found that out.
@@ -157,10 +144,10 @@ void explain(std::string &answer, const history &told, const led_change &change,
 {
     const trace_entry &request = told.trace->entries[change.request];
     const std::vector<size_t> way = way_to(told, change, led);
-    const lines decisions = decisions_on(told, way);
+    const lines decisions = told_on(told, way, decision);
     put(answer, "set off by", describe(told, change.in));
-    put_all(answer, "read", values_on(told, way));
-    put_all(answer, "decided", decisions.empty() ? decisions_on(told, all_before(told, change)) : decisions);
+    put_all(answer, "read", told_on(told, way, value_read));
+    put_all(answer, "decided", decisions.empty() ? told_on(told, all_before(told, change), decision) : decisions);
     if (const std::optional<led_wanted> wanted = led_request_of(request); wanted && !told.from_log) {
         put(answer, "asked for", describe(wanted->look) + (change.failed ? "" : ", which the board did"));
     }
@@ -203,6 +190,13 @@ size_t origin_of(const std::vector<led_change> &changes, size_t last)
     return last;
 }
 
+void explain_untold(std::string &answer, const history &told, const led_change *change)
+{
+    if (told.from_log) {
+        put_all(answer, "not in the log", untold_by_log(told, change));
+    }
+}
+
 void explain_last_asked(std::string &answer, const history &told, const led_change &last, int led)
 {
     if (last.failed) {
@@ -224,6 +218,7 @@ std::string why(const history &told, int led, size_t until)
         answer = name + " is dark: nobody has asked for it since the " + (told.from_log ? "log" : "trace") +
                  " begins, at " + when(told, 0) + "\n";
         explain_drops(answer, told, led, 0, until);
+        explain_untold(answer, told, nullptr);
         return answer;
     }
     const led_change &last = changes[count - 1];
@@ -242,6 +237,7 @@ std::string why(const history &told, int led, size_t until)
     if (dark) {
         explain_drops(answer, told, led, origin.request, until);
     }
+    explain_untold(answer, told, &origin);
     return answer;
 }
 
@@ -254,7 +250,7 @@ std::string why_always(const history &told, int led)
             continue;
         }
         std::string row = when(told, change.request) + "  " + look;
-        row.resize(std::max<size_t>(row.size() + 1, 30), ' ');
+        row.resize(std::max<size_t>(row.size() + 1, told.from_log ? 44 : 30), ' ');
         answer += row + describe(told, change.in) + "\n";
     }
     return answer.empty() ? std::string(led_name(led)) + " never changes\n" : answer;

@@ -7,6 +7,8 @@
 #include <numeric>
 #include <vector>
 
+using namespace product_set;
+
 namespace
 {
 #define EVENT(module, name)                                                                                            \
@@ -56,11 +58,11 @@ constexpr std::array commands = {
 };
 
 constexpr std::array products = {
-    product_name{"UFI",          "NO_DRIVER_UFI" },
-    product_name{"DATA_CARD",    "ONLY_DATA_CARD"},
-    product_name{"PAPER_KITE",   "PAPER_KITE"    },
-    product_name{"MODULE",       "MODULE"        },
-    product_name{"UNI_CORE_CPE", "UNI_CORE_CPE"  },
+    product_name{"UFI",          "NO_DRIVER_UFI",  UFI         },
+    product_name{"DATA_CARD",    "ONLY_DATA_CARD", DATA_CARD   },
+    product_name{"PAPER_KITE",   "PAPER_KITE",     PAPER_KITE  },
+    product_name{"MODULE",       "MODULE",         MODULE      },
+    product_name{"UNI_CORE_CPE", "UNI_CORE_CPE",   UNI_CORE_CPE},
 };
 
 // What may be left out of a constant; the longer one first.
@@ -138,6 +140,16 @@ void append(std::string &list, std::string_view name)
 std::span<const product_name> all_products()
 {
     return products;
+}
+
+std::span<const event_name> all_events()
+{
+    return events;
+}
+
+std::span<const command_name> all_commands()
+{
+    return commands;
 }
 
 std::string_view led_name(int led_id)
@@ -271,9 +283,15 @@ bool is_platform_call(std::string_view name)
 
 std::string nearest_platform_call(std::string_view name)
 {
-    return std::string(*std::min_element(
-        platform_calls.begin(), platform_calls.end(),
-        [name](std::string_view one, std::string_view other) { return distance(name, one) < distance(name, other); }));
+    return nearest(name, platform_calls);
+}
+
+std::string nearest(std::string_view name, std::span<const std::string_view> known)
+{
+    return std::string(
+        *std::min_element(known.begin(), known.end(), [name](std::string_view one, std::string_view other) {
+            return distance(name, one) < distance(name, other);
+        }));
 }
 
 const product_name *find_product(std::string_view name)

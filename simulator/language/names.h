@@ -20,12 +20,26 @@ struct command_name {
     int value;
 };
 
+// Products as a set.
+namespace product_set
+{
+constexpr unsigned UFI = 1;
+constexpr unsigned DATA_CARD = 2;
+constexpr unsigned PAPER_KITE = 4;
+constexpr unsigned MODULE = 8;
+constexpr unsigned UNI_CORE_CPE = 16;
+constexpr unsigned EVERY_PRODUCT = 31;
+} // namespace product_set
+
 struct product_name {
     std::string_view name;
     std::string_view cfg_text; // configuration item 6000
+    unsigned mask;             // its bit in a product_set
 };
 
 std::span<const product_name> all_products();
+std::span<const event_name> all_events();
+std::span<const command_name> all_commands();
 
 std::string_view led_name(int led_id); // empty for an id that no LED has
 std::optional<int> find_led(std::string_view name);
@@ -49,6 +63,9 @@ std::string_view command_name_of(int command); // empty for a command without a 
 // The platform calls that a scenario can make fail.
 bool is_platform_call(std::string_view name);
 std::string nearest_platform_call(std::string_view name);
+
+// The one of them that takes the fewest letters put in, taken out or changed.
+std::string nearest(std::string_view name, std::span<const std::string_view> known);
 
 const product_name *find_product(std::string_view name);
 std::string product_names();

@@ -10,6 +10,7 @@ constexpr size_t MAX_REPEATS_DEEP = 8;
 constexpr size_t MAX_STATEMENTS = 100'000;
 constexpr size_t MAX_LINE = 8192;
 constexpr size_t MAX_ERRORS = 50;
+constexpr std::string_view BYTE_ORDER_MARK = "\xef\xbb\xbf";
 
 // One scenario on its way to statements.
 struct reading {
@@ -158,6 +159,10 @@ bool parse_text(reading &state, std::string_view text, const std::string &name, 
     state.story.included_at.push_back(state.including);
     if (text.size() > SCENARIO_FILE_MAX) {
         return refuse(state, from, 1, "the file is larger than 256 KiB");
+    }
+    if (text.starts_with(BYTE_ORDER_MARK)) {
+        text.remove_prefix(BYTE_ORDER_MARK.size());
+        state.story.has_byte_order_mark = true;
     }
     while (!text.empty()) {
         const size_t end = std::min(text.find('\n'), text.size());

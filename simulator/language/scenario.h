@@ -100,6 +100,7 @@ struct scenario {
     std::vector<std::string> files;         // the first is the scenario itself, the others are what it includes
     std::vector<include_place> included_at; // of each file; of the first it means nothing
     std::vector<statement> statements;
+    bool has_byte_order_mark = false; // an editor's, in one of the files
 };
 
 // Reads a file for an include. False when there is none.

@@ -1,6 +1,7 @@
 // A run on its way to its picture.
 #pragma once
 
+#include "evidence/show.h"
 #include "panel/picture.h"
 #include "player.h"
 
@@ -12,3 +13,6 @@ struct sketch {
 
 // Adds a statement that has been played, in the order of the run.
 void add_to_sketch(sketch &s, const statement &what, const played &did);
+
+// The picture of a trace, which knows no expectations.
+run_picture picture_of(const std::vector<shown_step> &steps, const std::string &title);

@@ -29,10 +29,25 @@ json clock_of(const session &s)
     };
 }
 
+// The events that a module would tell this daemon of, as a notify names them.
+json heard_by(const session &s)
+{
+    json events = json::array();
+    for (const module_row &module : module_rows) {
+        for (const event_name &event : all_events()) {
+            if (event.module_id == module.module_id && is_heard(s.device.device.wires, event.module_id, event.value)) {
+                events.push_back(std::string(module.name) + " " + event_word(event.module_id, event.value));
+            }
+        }
+    }
+    return events;
+}
+
 json daemon_of(const session &s)
 {
     const daemon_process &process = s.device.device.process;
     return {
+        {"hears",    heard_by(s)             },
         {"alive",    process.pid >= 0        },
         {"launched", s.device.device.launched},
         {"pid",      process.pid             },

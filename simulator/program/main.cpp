@@ -1,12 +1,15 @@
 // kiv_led_sim: plays scenarios against the daemon on a PC.
 #include "evidence/commands.h"
+#include "language/doubts.h"
 #include "language/names.h"
 #include "language/words.h"
 #include "live/commands.h"
 #include "live/watch.h"
 #include "panel/panel.h"
+#include "panel/sketch.h"
 #include "panel/table_picture.h"
 #include "program/run.h"
+#include "reference.h"
 #include "stories.h"
 #include "table.h"
 
@@ -55,6 +58,33 @@ int table(const std::string &name, daemon_options options, bool as_svg)
     return 0;
 }
 
+int show_trace(const evidence_options &options, const std::string &picture_path)
+{
+    std::vector<shown_step> steps;
+    std::string error;
+    if (const int result = show_command(options, steps)) {
+        return result;
+    }
+    if (!picture_path.empty() && !write_file(picture_path, draw_run(picture_of(steps, options.file)), error)) {
+        fprintf(stderr, "%s\n", error.c_str());
+        return EXIT_UNREADABLE;
+    }
+    return 0;
+}
+
+int words_of(const std::string &name, daemon_options options)
+{
+    const product_name *product = find_product(name);
+    std::string error;
+    if (!product && !name.empty()) {
+        error = "unknown product '" + name + "'; products are " + product_names();
+    } else if (find_daemon(options, error)) {
+        return print_reference(product, options);
+    }
+    fprintf(stderr, "%s\n", error.c_str());
+    return EXIT_UNREADABLE;
+}
+
 int check(const std::vector<std::string> &paths)
 {
     std::vector<std::string> files;
@@ -65,6 +95,10 @@ int check(const std::vector<std::string> &paths)
         if (!load_story(path, story, error)) {
             fputs(error.c_str(), stderr);
             worst = EXIT_UNREADABLE;
+            continue;
+        }
+        for (const std::string &doubt : find_doubts(story)) {
+            fprintf(stderr, "%s\n", doubt.c_str());
         }
     }
     return worst;
@@ -105,6 +139,10 @@ int main(int argc, char **argv)
     table_command->add_option("PRODUCT", product, "One of " + product_names())->required();
     table_command->add_flag("--svg", as_svg, "As a picture, for a user's manual");
 
+    CLI::App *words_command =
+        app.add_subcommand("words", "List the words of scenarios, and what the daemon makes of them");
+    words_command->add_option("PRODUCT", product, "Only what this one hears and reads: " + product_names());
+
     live_options live;
     CLI::App *live_app = app.add_subcommand("live", "Talk to a daemon on the wall clock");
     live_app->add_option("--product", live.product, "Start it as one of " + product_names());
@@ -127,11 +165,13 @@ int main(int argc, char **argv)
     CLI::App *show = app.add_subcommand("show", "Show a trace as a timeline");
     show->add_option("TRACE", evidence.file, "What run --trace or a recording left")->required();
     show->add_flag("--all-requests", evidence.all_requests, "Show every LED request, not only what it changes");
+    show->add_option("--picture", options.picture_path, "Draw the trace into this SVG file");
 
     CLI::App *why = app.add_subcommand("why", "Say why an LED shows what it shows");
-    why->add_option("TRACE", evidence.file, "What run --trace or a recording left")->required();
+    why->add_option("TRACE", evidence.file, "What run --trace or a recording left, or a log")->required();
     why->add_option("LED", evidence.led, "Its name, such as bat_green")->required();
-    why->add_option("--at", evidence.at_s, "At this second of the trace; otherwise at its end");
+    why->add_option("--at", evidence.at_s, "At this second of the trace or line of the log; otherwise at its end");
+    why->add_flag("--log", evidence.from_log, "The file is a plain log of a device");
     why->add_flag("--all", evidence.always, "Every change of the LED with its cause");
 
     CLI::App *story = app.add_subcommand("story", "Tell a trace as a scenario");
@@ -159,7 +199,7 @@ int main(int argc, char **argv)
     CLI::App *watch = app.add_subcommand("watch", "Show the LEDs and the log of a daemon that runs");
     watch->add_option("--device", live.device, "Its device directory")->required();
 
-    for (CLI::App *command : {run_command, table_command, panel_command, live_app}) {
+    for (CLI::App *command : {run_command, table_command, words_command, panel_command, live_app}) {
         command->add_option("--daemon", options.daemon.daemon, "The daemon's program");
         command->add_option("--emulator", options.daemon.emulator, "A command that runs the daemon's program");
     }
@@ -175,12 +215,15 @@ int main(int argc, char **argv)
     if (*table_command) {
         return table(product, options.daemon, as_svg);
     }
+    if (*words_command) {
+        return words_of(product, options.daemon);
+    }
     if (*panel_command) {
         panel.process = options.daemon;
         return run_panel(panel);
     }
     if (*show) {
-        return show_command(evidence);
+        return show_trace(evidence, options.picture_path);
     }
     if (*story) {
         return story_command(evidence);

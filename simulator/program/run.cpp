@@ -12,6 +12,7 @@
 #include <chrono>
 #include <csignal>
 #include <cstdio>
+#include <cstring>
 #include <filesystem>
 #include <fstream>
 #include <sstream>
@@ -23,6 +24,8 @@ namespace fs = std::filesystem;
 
 namespace
 {
+constexpr std::streamsize PIECE_BYTES = 1 << 16;
+
 volatile sig_atomic_t ended_by; // the signal that ends us
 
 // One scenario, and the process that plays it. Its folder holds its device and what the process leaves for us.
@@ -60,7 +63,7 @@ bool may_become_trace(const std::string &path)
     if (!fs::exists(there)) {
         return true;
     }
-    const std::string line = first_line(path);
+    const std::string line = fs::is_regular_file(there) ? first_line(path) : "";
     if (fs::is_regular_file(there) && (line.empty() || line.starts_with("#") || parse_trace_line(line))) {
         return fs::path(path).extension() != ".scn";
     }
@@ -72,7 +75,7 @@ void leave(const run_job &job, const char *name, const std::string &text)
 {
     std::string error;
     if (!text.empty() && !write_file(job.folder + "/" + name, text, error)) {
-        fprintf(stderr, "%s\n", error.c_str());
+        fprintf(stderr, "%s\n%s", error.c_str(), strcmp(name, "failure") == 0 ? text.c_str() : "");
     }
 }
 
@@ -321,12 +324,14 @@ bool finish_one(std::vector<run_job> &jobs)
     return false;
 }
 
+// False when a byte of it did not arrive.
 bool append_trace(const run_job &job, const std::string &to)
 {
     std::ifstream in(job.folder + "/trace", std::ios::binary);
     std::ofstream out(to, std::ios::binary | std::ios::app);
-    if (in && in.peek() != EOF) {
-        out << in.rdbuf();
+    std::vector<char> piece(PIECE_BYTES);
+    while (in.read(piece.data(), PIECE_BYTES), in.gcount() > 0) {
+        out.write(piece.data(), in.gcount());
     }
     out.close();
     return !out.fail();
@@ -355,7 +360,7 @@ int play_all(const run_options &options, std::vector<run_job> &jobs)
             keep_artifacts(options, job);
             print_outcome(options, job, captured, jobs.size());
             if (!options.trace_path.empty() && !append_trace(job, options.trace_path + ".new")) {
-                fprintf(stderr, "%s.new cannot be written\n", options.trace_path.c_str());
+                fprintf(stderr, "%s cannot be written\n", options.trace_path.c_str());
                 worst = PLAY_IMPOSSIBLE;
             }
             worst = std::max(worst, job.outcome.result);
@@ -427,6 +432,7 @@ int run(run_options options)
     if (!options.trace_path.empty() && worst != PLAY_IMPOSSIBLE) {
         fs::rename(options.trace_path + ".new", options.trace_path, failure);
     }
+    fs::remove(options.trace_path + ".new", failure);
     if (!options.junit_path.empty() && !write_file(options.junit_path, junit_report(outcomes), error)) {
         fprintf(stderr, "%s\n", error.c_str());
         worst = PLAY_IMPOSSIBLE;

@@ -1,5 +1,6 @@
 #include "world/daemon_process.h"
 
+#include "trace/line.h"
 #include "world/running_daemon.h"
 #include "world/standstill.h"
 
@@ -192,6 +193,12 @@ std::string describe_end(int status)
     return "ended with status " + std::to_string(WEXITSTATUS(status));
 }
 
+void note_end(daemon_process &process, int status)
+{
+    process.end = describe_end(status);
+    process.lost_trace = WIFEXITED(status) && WEXITSTATUS(status) == TRACE_LOST_STATUS;
+}
+
 struct patience {
     int asleep_ms = 0; // all threads wait for something that the clock does not know
     int silent_ms = 0; // the trace has not grown
@@ -233,7 +240,7 @@ run_result collect_end(daemon_process &process)
     while (waitpid(process.pid, &status, 0) < 0 && errno == EINTR) {
         continue;
     }
-    process.end = describe_end(status);
+    note_end(process, status);
     let_go(process);
     return run_result::ENDED;
 }
@@ -267,6 +274,7 @@ bool find_daemon(daemon_options &options, std::string &error)
 bool launch(daemon_process &process, const daemon_options &options, const std::string &device,
             const std::string &trace_path, int64_t now_ns, int64_t wall_offset_ns, std::string &error)
 {
+    process.lost_trace = false;
     std::array<int, 2> pair = {-1, -1};
     process.end.clear();
     process.trace_path = trace_path;
@@ -340,7 +348,7 @@ bool has_ended(daemon_process &process)
     if (waitpid(process.pid, &status, WNOHANG) != process.pid) {
         return false;
     }
-    process.end = describe_end(status);
+    note_end(process, status);
     let_go(process);
     return true;
 }

@@ -23,9 +23,10 @@ struct daemon_process {
     int control = -1;                       // the simulator's end towards the clock; -1 in real time
     int64_t next_deadline_ns = CLOCK_NEVER; // of its threads, once it is idle in virtual time
     std::string trace_path;
-    std::string end;    // how it ended, when it did so by itself, or what its threads wait in when they stand still
-    bool ours = true;   // false: others have started it, and end it
-    bool under = false; // pid is a tool's that has started the daemon, or will
+    std::string end; // how it ended, when it did so by itself, or what its threads wait in when they stand still
+    bool lost_trace = false;     // what it did is not all in the trace, and so nobody knows
+    bool ours = true;            // false: others have started it, and end it
+    bool under = false;          // pid is a tool's that has started the daemon, or will
     bool lends_terminal = false; // to that tool, which a person ends
     std::string device;          // where it runs
 };

@@ -88,19 +88,23 @@ void remove_faults(const std::string &device, const std::string &call)
 
 bool write_file(const std::string &path, const std::string &text, std::string &error)
 {
-    const std::string fresh = path + ".new";
     std::error_code failure;
+    const bool is_special = fs::exists(path, failure) && !fs::is_regular_file(path, failure); // /dev/stdout, a pipe
+    const std::string fresh = is_special ? path : path + ".new";
     std::ofstream out(fresh, std::ios::binary | std::ios::trunc);
     out << text;
     out.close();
-    if (out) {
+    const int cause = errno;
+    if (out && !is_special) {
         fs::rename(fresh, path, failure);
     }
     if (out && !failure) {
         return true;
     }
-    error = path + " cannot be written: " + (failure ? failure.message() : strerror(errno));
-    fs::remove(fresh, failure);
+    error = path + " cannot be written: " + (failure ? failure.message() : strerror(cause));
+    if (!is_special) {
+        fs::remove(fresh, failure);
+    }
     return false;
 }
 

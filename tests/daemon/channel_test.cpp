@@ -182,3 +182,16 @@ DEVICE_TEST(channel, Handshake)
         copy 104
         info kiv_mirta_led "recive daemon message to start!!!!\n")");
 }
+
+DEVICE_TEST(channel, ARegistrationThatIsTakenIsNoFault)
+{
+    fake_platform().inbox = {
+        message_bytes(MSG_CMD_SERVICE_REG, KIV_MODULE_LED, KIV_MODULE_SMS, 1, std::string(12, '\0')),
+        std::string("\2\0\0\0", 4)};
+    step(kiv_led_wait_for_daemon);
+    expect_log("kiv_mirta_led", R"(
+        info "kiv_led_wait_for_daemon start...\n"
+        info "led init msg success!\n"
+        info "[kiv_mirta_led,main]reg, soure=[5],mask1=[1],mask2=[0],mask3=[0],mask4=[0]\n"
+        info "recive daemon message to start!!!!\n")");
+}

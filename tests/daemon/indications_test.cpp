@@ -1,5 +1,6 @@
 // The indications that products share: network, signal, Wi-Fi, SMS, voicemail and phone.
 #include "harness.h"
+#include "policy/common/sms.h"
 
 DEVICE_TEST(network, ClassOfEachName)
 {
@@ -322,6 +323,15 @@ DEVICE_TEST(sms, StoreFull)
     nv("sms_nvtotal_count", "99");
     notify(KIV_MODULE_SMS, REG_WMS_SMS_NV_UNREAD_SMS);
     expect_effects("only sms_blue on 4");
+}
+
+DEVICE_TEST(sms, AStateThatIsNoneIsForgotten)
+{
+    switched_on(LED_PRODUCT_UFI);
+    led_sms_state = SMS_STORE_FULL;
+    step([] { kiv_led_handle_sms_state(9); });
+    expect_effects("");
+    EXPECT_EQ(int{led_sms_state}, SMS_STORE_FULL);
 }
 
 DEVICE_TEST(sms, OffAndAsleepItIsOnlyRemembered)

@@ -232,6 +232,9 @@ DEVICE_TEST(single_chip, SignalStatusAtWakeUp)
         sig_6 on 4
         sig_6 on 4
         sig_6 on 4)");
+    step([] { kiv_singlechip_led_set_sigal_status(1); });
+    expect_log("kiv_mirta_led_set_status_singlechip",
+               R"(info "enter kiv_singlechip_led_set_sigal_status signal_state=1\n")");
 }
 
 DEVICE_TEST(single_chip, Relight)

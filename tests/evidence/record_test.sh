@@ -1,7 +1,10 @@
 #!/usr/bin/env bash
-# The recorder on a device that has nothing of the stand-ins: record_test.sh RECORDER DEVICE SIMULATOR DAEMON
+# The recorder on a device that has nothing of the stand-ins: record_test.sh RECORDER DEVICE DAEMON REPLAYER [EMULATOR...]
+# REPLAYER: the simulator that replays what was recorded, or none.
 set -u
-recorder=$1 device=$2 simulator=$3 daemon=$4
+recorder=$1 device=$2 daemon=$3 replayer=$4
+shift 4
+emulator=("$@")
 work=$(mktemp -d)
 trap 'rm -rf "$work"' EXIT
 failures=0
@@ -17,10 +20,26 @@ fail() {
 
 # record SECONDS VARIABLE=VALUE...: runs the daemon on the device for so long, then cuts its power.
 record() {
-    local seconds=$1
+    local seconds=$1 variables=() variable
     shift
-    env LD_LIBRARY_PATH="$work" LD_PRELOAD="$recorder" OTHER_DEVICE_FLOOD=0 "$@" \
-        timeout -s KILL "$seconds" "$daemon" >/dev/null 2>"$work/errors"
+    for variable in LD_LIBRARY_PATH="$work" LD_PRELOAD="$recorder" OTHER_DEVICE_FLOOD=0 "$@"; do
+        [ ${#emulator[@]} = 0 ] || variables+=(-E)
+        variables+=("$variable")
+    done
+    if [ ${#emulator[@]} = 0 ]; then
+        env "${variables[@]}" timeout -s KILL "$seconds" "$daemon" >/dev/null 2>"$work/errors"
+    else
+        timeout -s KILL "$seconds" "${emulator[@]}" "${variables[@]}" "$daemon" >/dev/null 2>"$work/errors"
+    fi
+}
+
+# replay FILE: the daemon does it again, and the story of it holds.
+replay() {
+    local said
+    said=$("$replayer" replay --lines --trace "$work/again" --daemon "$daemon" "$work/$1" 2>&1) || fail "$said"
+    cmp -s <(head -$(wc -l <"$work/again") "$work/$1") "$work/again" || fail "the replay is another trace"
+    "$replayer" story "$work/$1" >"$work/$1.scn"
+    said=$("$replayer" run --quiet --daemon "$daemon" "$work/$1.scn" 2>&1) || fail "the story does not hold: $said"
 }
 
 # is FILE TEXT: a line of the file holds it.
@@ -39,10 +58,7 @@ is story 'receive kiv_bsp_set_leds_sync(sms_green off 0) = -19'
 is story 'timer kiv_timer_fire('
 ! grep -q log_level "$work/story" || fail "a library's own call is recorded"
 [ ! -s "$work/errors" ] || fail "$(cat "$work/errors")"
-said=$("$simulator" replay --lines --trace "$work/again" --daemon "$daemon" "$work/story" 2>&1) || fail "$said"
-"$simulator" story "$work/story" >"$work/story.scn"
-said=$("$simulator" run --quiet --daemon "$daemon" "$work/story.scn" 2>&1) || fail "the story does not hold: $said"
-cmp -s <(head -$(wc -l <"$work/again") "$work/story") "$work/again" || fail "the replay is another trace"
+[ "$replayer" = none ] || replay story
 
 # Another start goes on behind the first, and what a power cut has left of a line goes.
 printf '12.000000 main kiv_' >>"$work/story"

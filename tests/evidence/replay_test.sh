@@ -58,4 +58,22 @@ expect 2 "no line of a trace" "$work/garbage"
 truncate -s 65M "$work/enormous"
 expect 2 "larger than 64 MiB" "$work/enormous"
 
+# What the daemon writes on a device tells of an LED what its trace tells, also as syslog keeps it.
+mkdir "$work/device"
+printf 'product UFI\nnv battery_value=80\nstart\nnotify MAIN POWERON\nnotify SLEEP 1\n' >"$work/evening"
+KIV_DEVICE_DIR=$work/device KIV_TRACE=$work/device/trace KIV_LOG=$work/log "$daemon" >/dev/null 2>&1 &
+"$simulator" live --device "$work/device" "$work/evening" >/dev/null || fail "the session"
+kill $!
+while read -r line; do
+    echo "Nov 22 20:15:04 cpe kiv_mirta_led[312]: ${line#* * * * }"
+    echo "Nov 22 20:15:04 cpe kernel: kiv_led_set_bat_led_off"
+done <"$work/log" >"$work/syslog"
+for asked in "$work/device/trace" "--log $work/log" "--log $work/syslog"; do
+    # shellcheck disable=SC2086 # an option and a file
+    said=$("$simulator" why $asked bat_green)
+    [[ $said == "bat_green shows blink"*"notify SLEEP 1"* ]] || fail "why $asked: $said"
+done
+"$simulator" why --log "$daemon" bat_green 2>/dev/null
+[ $? = 2 ] || fail "a program for a log"
+
 exit "$failures"

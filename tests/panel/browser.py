@@ -44,6 +44,9 @@ class Browser:
         self.driver.stdout.close()
         self.profile.cleanup()
 
+    def devtools(self, command, **parameters):
+        return self.call("POST", "/goog/cdp/execute", {"cmd": command, "params": parameters})
+
     def open(self, url):
         self.call("POST", "/url", {"url": url})
         self.until("return document.getElementById('link').textContent === 'connected' && !!document.querySelector('.lens')")

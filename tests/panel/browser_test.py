@@ -66,6 +66,16 @@ class Page(unittest.TestCase):
                 self.assertTrue(lit)
                 self.assertEqual(self.browser.complaints(), [])
 
+    def test_offers_what_the_product_hears(self):
+        offered = """return [...document.querySelectorAll('#controls [data-says]')].filter((one) => !one.closest('[hidden]'))
+            .map((one) => one.textContent || one.closest('label').textContent.trim()).join('|')"""
+        wanted = {"UFI": ("Self-test", "Voicemail"), "DATA_CARD": ("Bars", "On"), "MODULE": ("rings", "WPS pairing")}
+        for product, (shown, hidden) in wanted.items():
+            with self.subTest(product):
+                self.open(product)
+                self.browser.until(f"return !(() => {{ {offered} }})().split('|').includes(arguments[0])", hidden)
+                self.assertIn(shown, self.browser.run(offered))
+
     def test_a_click_lights_the_right_led(self):
         self.open()
         self.wait_lit("net_blue")
@@ -171,6 +181,27 @@ class Page(unittest.TestCase):
         self.browser.until("return document.getElementById('death').hidden")
         self.click_button("On", "#controls")
         self.wait_lit("bat_green")
+
+    def test_suits_its_person(self):
+        def prefers(**features):
+            pairs = [{"name": "prefers-" + name.replace("_", "-"), "value": value} for name, value in features.items()]
+            self.browser.devtools("Emulation.setEmulatedMedia", features=pairs)
+
+        background = "return getComputedStyle(document.body).backgroundColor"
+        self.addCleanup(prefers)
+        prefers(color_scheme="light", reduced_motion="reduce")
+        panel = self.open()
+        light = self.browser.run(background)
+        self.click_button("New message")
+        self.browser.until(LENS_SAYS, "Messages: blue, blinking, 0.8 s on, 1.2 s off, brightness 4 of 4")
+        for _ in range(4):
+            panel.do("after 500ms")
+            self.wait_lit("sms_blue", True)
+        prefers(color_scheme="dark")
+        self.assertNotEqual(self.browser.run(background), light)
+        self.addCleanup(self.browser.devtools, "Emulation.clearDeviceMetricsOverride")
+        self.browser.devtools("Emulation.setDeviceMetricsOverride", width=360, height=700, deviceScaleFactor=1, mobile=True)
+        self.assertLessEqual(self.browser.run("return document.documentElement.scrollWidth"), 360)
 
     def test_keyboard_alone(self):
         self.open()

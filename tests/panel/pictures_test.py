@@ -65,6 +65,17 @@ class Pictures(unittest.TestCase):
                     self.assertLessEqual(float(bar.get("x")) + float(bar.get("width")), PICTURE_WIDTH)
                 self.assertEqual(bars, shown)
 
+    def test_a_trace_is_drawn_like_its_run(self):
+        trace = self.folder / "a.trace"
+        of_trace = self.folder / "trace.svg"
+        run("scenarios/handheld/a-day.scn", "--picture", self.file, "--trace", trace)
+        subprocess.run([simulator, "show", "--picture", of_trace, trace], capture_output=True, check=True)
+        drawn_bars = [[(bar.get("data-led"), bar.get("data-look")) for bar in elements(drawn(picture), "rect", "bar")]
+                      for picture in (self.file, of_trace)]
+        self.assertGreater(len(drawn_bars[0]), 10)
+        self.assertEqual(*drawn_bars)
+        self.assertIn("notify MAIN POWERON", texts(drawn(of_trace)))
+
     def test_idle_days_are_shortened(self):
         self.play("product UFI\nnv battery_exist=1 battery_value=80\nstart\nnotify MAIN POWERON\nafter 10s\n"
                   "notify SMS NEW_SMS\nafter 10s\nafter 3d\nnotify SLEEP 1\nafter 20s\nnotify SLEEP 0\nafter 5s\n")

@@ -1,11 +1,18 @@
 // The program as a whole, with the daemon itself.
+#include "language/vocabulary.h"
+#include "seen/trace.h"
 #include "world/device.h"
 
+#include <algorithm>
 #include <cstdio>
+#include <fcntl.h>
 #include <filesystem>
 #include <fstream>
 #include <gtest/gtest.h>
+#include <sstream>
+#include <sys/stat.h>
 #include <sys/wait.h>
+#include <unistd.h>
 
 namespace fs = std::filesystem;
 
@@ -147,8 +154,27 @@ TEST_F(Play, WritesOverNothingButATrace)
     read_file(place + "/a.scn", text);
     EXPECT_EQ(text, story);
     EXPECT_EQ(play(story, "--trace .").code, 2);
+    ASSERT_EQ(mkfifo((place + "/pipe").c_str(), 0600), 0);
+    EXPECT_EQ(play(story, "--trace pipe").code, 2);
+    const int reader = open((place + "/pipe").c_str(), O_RDWR | O_NONBLOCK);
+    EXPECT_EQ(play(story, "--junit pipe").code, 0);
+    text.assign(4096, '\0');
+    EXPECT_GT(read(reader, text.data(), text.size()), 0);
+    EXPECT_NE(text.find("tests=\"1\" failures=\"0\""), std::string::npos) << text;
+    close(reader);
     EXPECT_EQ(play(story, "--trace t").code, 0);
     EXPECT_EQ(play(story, "--trace t").code, 0);
+}
+
+TEST_F(Play, TakesNoEndForAnExpectedOneWhenTheTraceIsLost)
+{
+    std::ofstream(place + "/daemon") << "#!/bin/sh\nexit 74\n";
+    fs::permissions(place + "/daemon", fs::perms::owner_all);
+    for (const std::string options : {"", "--real-time "}) {
+        const outcome result = play("product UFI\nlaunch\nexpect ended\n", options + "--daemon ./daemon");
+        EXPECT_EQ(result.code, 2) << options << result.printed;
+        EXPECT_NE(result.printed.find("its trace could not be written\n"), std::string::npos) << result.printed;
+    }
 }
 
 TEST_F(Play, TellsACiSystemWhatFailed)
@@ -225,4 +251,36 @@ TEST_F(Play, GoesOnTheWallClock)
         play(POWERED + "notify SMS NEW_SMS\nafter 200ms\nexpect sms_blue blink 800/1200 4\n", "--real-time");
     EXPECT_EQ(result.code, 0) << result.printed;
     EXPECT_EQ(play(POWERED + "clock 22:00\n", "--real-time").code, 2);
+}
+
+// The vocabulary is written by hand; that it is the daemon's own is seen here.
+TEST_F(Play, KnowsTheDaemonsWords)
+{
+    std::string text = POWERED;
+    const std::string classes = "2G3G4G5G";
+    for (const network_word &word : network_words()) {
+        const size_t shown_as = classes.find(word.shown_as) / 2 + 2;
+        text += "nv network_type=" + std::string(word.name) + "\nnotify NWINFO NETTYPE\n" +
+                "expect log \"enter kiv_led_handle_nwinfoStatus : " + std::to_string(shown_as) + "\"\n";
+    }
+    EXPECT_EQ(play(text).code, 0);
+
+    std::ostringstream program;
+    program << std::ifstream(DAEMON, std::ios::binary).rdbuf();
+    for (const nv_word &word : nv_words()) {
+        EXPECT_NE(program.str().find(word.key), std::string::npos) << word.key;
+    }
+    for (const auto &trace : fs::directory_iterator(RECORDINGS)) {
+        std::ifstream lines(trace.path());
+        for (std::string line; std::getline(lines, line);) {
+            const std::optional<trace_entry> entry = parse_trace_line(line);
+            if (entry && entry->call == "kiv_syslog_append") {
+                const std::string source = quoted_texts(entry->arguments).at(0);
+                EXPECT_NE(std::ranges::find(log_sources(), source), log_sources().end()) << source;
+            } else if (entry && entry->call == "kiv_nvconfig_read") {
+                const std::string key = quoted_texts(entry->arguments).at(0);
+                EXPECT_NE(std::ranges::find(nv_words(), key, &nv_word::key), nv_words().end()) << key;
+            }
+        }
+    }
 }

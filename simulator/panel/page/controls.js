@@ -93,6 +93,7 @@ function makeButton(item, act) {
   button.type = 'button';
   button.textContent = item.label;
   button.title = item.text;
+  button.dataset.says = item.text;
   button.addEventListener('click', () => act(item.text));
   return button;
 }
@@ -102,6 +103,7 @@ function makeChoice(item, act) {
   const select = document.createElement('select');
   select.dataset.control = item.name;
   select.append(new Option('choose…', ''), ...item.options.map(([word, text]) => new Option(word, text)));
+  [...select.options].slice(1).forEach((option) => { option.dataset.says = option.value; });
   select.addEventListener('change', () => select.value && act(select.value));
   return labelled(item.label, select);
 }
@@ -111,6 +113,7 @@ function makeSlider(item, act) {
   const value = document.createElement('output');
   Object.assign(range, { type: 'range', min: 0, max: item.most });
   range.value = value.textContent = item.value;
+  range.dataset.says = item.text(item.value);
   range.addEventListener('input', () => { value.textContent = range.value; });
   range.addEventListener('change', () => act(item.text(range.value)));
   const label = labelled(item.label, range);
@@ -129,5 +132,20 @@ export function makeControls(place, act) {
       return make(item, perform);
     }));
     place.append(box);
+  }
+}
+
+const hides = (within) => [...within.querySelectorAll('[data-says]')].every((one) => one.hidden);
+
+// What the daemon of this product has not asked to be told of is not offered; before it has asked, everything is.
+export function offerWhatIsHeard() {
+  const hears = device.daemon.hears ?? [];
+  const names = (module, word) => (one) => one === `${module} ${word}` || (!/^[A-Z_]{2,}$/.test(word) && one.startsWith(`${module} `));
+  const reaches = (text) => [...text.matchAll(/^notify (\w+) (\S+)/gm)].every(([, module, word]) => hears.some(names(module, word)));
+  for (const one of document.querySelectorAll('#controls [data-says]')) {
+    one.hidden = hears.length > 1 && !reaches(one.dataset.says);
+  }
+  for (const around of document.querySelectorAll('#controls label, #controls fieldset')) {
+    around.hidden = hides(around);
   }
 }

@@ -2,7 +2,7 @@
 import { device, ask, read, setClock, now, timeText } from './device.js';
 import { drawFront, setLooks, blink } from './front.js';
 import { clearStrip, addChange, addTick, drawStrip } from './strip.js';
-import { makeControls } from './controls.js';
+import { makeControls, offerWhatIsHeard } from './controls.js';
 import { clearLog, addLines, drawLog } from './log.js';
 import { drawStory, markStory } from './story.js';
 
@@ -13,6 +13,7 @@ let loading = null;
 let batches = 0; // that the last state held
 
 function drawDaemon() {
+  offerWhatIsHeard();
   const { alive, launched, end } = device.daemon;
   by('death').hidden = alive || !launched;
   by('cause').textContent = `The daemon ${end || 'has been killed'}.`;

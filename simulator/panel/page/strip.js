@@ -5,6 +5,7 @@ const canvas = document.getElementById('strip');
 const span = document.getElementById('window');
 const ROW = 18;
 const LEFT = 118;
+const NARROW = 480; // where the times at both ends would meet
 const FOOT = 18;
 const BARS_MAX = 600; // an LED
 const TICKS_MAX = 1000;
@@ -123,7 +124,7 @@ export function drawStrip() {
     }
   }
   context.textAlign = 'left';
-  context.fillText(begin > 0 ? timeText(begin) : `${timeText(0)} and before`, LEFT, height - 7);
+  context.fillText(begin > 0 ? timeText(begin) : width < NARROW ? '' : `${timeText(0)} and before`, LEFT, height - 7);
   context.textAlign = 'right';
   context.fillText(timeText(end), width - 4, height - 7);
 }

@@ -1,3 +1,4 @@
+#include "language/doubts.h"
 #include "language/scenario.h"
 
 #include <gtest/gtest.h>
@@ -227,4 +228,39 @@ TEST(Parser, ReadsLinesWithoutNewlineOrWithCarriageReturn)
     ASSERT_EQ(story.statements.size(), 2U);
     EXPECT_EQ(story.statements[0].text, "start");
     EXPECT_EQ(story.statements[1].line, 4);
+}
+
+TEST(Parser, DoubtsWhatParsesAndIsProbablyNotMeant)
+{
+    const std::map<std::string, std::string> doubts = {
+        {"nv battery_valeu=3",                           "the daemon never reads NV 'battery_valeu'; did you mean battery_value?"},
+        {"notify VOICE X",                               "'X' means nothing to the daemon; it knows PHONE LED ON"                },
+        {"notify SLEEP off",                             "'off' means nothing to the daemon; it knows 1 asleep"                  },
+        {"notify MAIN POWERON 1",                        "the daemon does not look at the text of this event"                    },
+        {"indication 1358",                              "no board sends indication 1358"                                        },
+        {"fail kiv_bsp_set_leds_sync bat_gren -5",       "there is no LED 'bat_gren'; did you mean bat_green?"                   },
+        {"repeat 2\nnv x=1\nend",                        "the daemon never reads NV 'x'"                                         },
+        {"notify VOICE \"PHONE BLINK\"",                 ""                                                                      },
+        {"notify SLEEP 5\nnotify DST FLOW_STATUS any",   ""                                                                      },
+        {"notify unregistered VOICE X\nnotify WLAN 4 x", ""                                                                      },
+        {"indication 1357\nraw 01",                      ""                                                                      },
+        {"fail kiv_bsp_set_leds_sync \"net_ blink\" -5", ""                                                                      },
+    };
+    for (const auto &[line, doubt] : doubts) {
+        scenario story;
+        std::string error;
+        const std::string text = "product UFI\nstart\n" + line + "\nexpect alive\n";
+        ASSERT_TRUE(parse_scenario(text, "a.scn", load, story, error)) << error;
+        const std::vector<std::string> found = find_doubts(story);
+        ASSERT_EQ(found.size(), doubt.empty() ? 0U : 1U) << line;
+        EXPECT_TRUE(doubt.empty() || found[0].find(": warning: " + doubt) != std::string::npos) << found[0];
+    }
+    scenario story;
+    std::string error;
+    ASSERT_TRUE(parse_scenario("\xef\xbb\xbfstart\nnotify MAIN POWERON\n", "a.scn", load, story, error)) << error;
+    const std::vector<std::string> expected = {
+        "a.scn: warning: a file begins with a byte-order mark; it is passed over",
+        "a.scn:1: warning: no product is set; without one the daemon takes the device for a data card",
+        "a.scn: warning: the scenario expects nothing"};
+    EXPECT_EQ(find_doubts(story), expected);
 }
