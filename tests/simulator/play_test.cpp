@@ -177,6 +177,17 @@ TEST_F(Play, TakesNoEndForAnExpectedOneWhenTheTraceIsLost)
     }
 }
 
+TEST_F(Play, NamesWhatAStandstillWaitsIn)
+{
+    ASSERT_EQ(mkfifo((place + "/pipe").c_str(), 0600), 0);
+    std::ofstream(place + "/daemon") << "#!/bin/sh\nexec cat pipe\n";
+    fs::permissions(place + "/daemon", fs::perms::owner_all);
+    const outcome result = play("product UFI\nlaunch\n", "--daemon ./daemon");
+    EXPECT_EQ(result.code, 2);
+    EXPECT_NE(result.printed.find("has not come to rest: thread 1 (cat) waits in openat"), std::string::npos)
+        << result.printed;
+}
+
 TEST_F(Play, TellsACiSystemWhatFailed)
 {
     std::ofstream(place + "/good.scn") << POWERED + "expect bat_green on 4\n";
