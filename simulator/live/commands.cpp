@@ -29,7 +29,7 @@ int refuse(const std::string &error)
 
 // Where a session's lines come from: a terminal, or a pipe.
 struct line_source {
-    session &s;
+    live_session &s;
     line_editor editor;
     std::string read_ahead;
 };
@@ -107,7 +107,7 @@ bool play_input(line_source &in)
     return true;
 }
 
-bool play_standard_input(session &s)
+bool play_standard_input(live_session &s)
 {
     line_source in = {.s = s, .editor = {}, .read_ahead = {}};
     if (!s.typed) {
@@ -122,7 +122,7 @@ bool play_standard_input(session &s)
     return played;
 }
 
-bool play_file(session &s, const std::string &path)
+bool play_file(live_session &s, const std::string &path)
 {
     scenario story;
     std::string error;
@@ -133,7 +133,7 @@ bool play_file(session &s, const std::string &path)
     return false;
 }
 
-void greet(const session &s)
+void greet(const live_session &s)
 {
     const rig &r = s.p.device;
     printf("the device is %s\n", r.device.c_str());
@@ -148,7 +148,7 @@ void greet(const session &s)
 }
 
 // What is left to say, and the exit code.
-int finish(session &s, bool played)
+int finish(live_session &s, bool played)
 {
     look_up(s);
     if (interrupt_signal != 0) {
@@ -222,7 +222,7 @@ std::string as_statement(const std::vector<std::string> &words)
 
 int live_command(const live_options &options)
 {
-    session s;
+    live_session s;
     std::string error;
     player_options how;
     how.process = options.process;
@@ -252,7 +252,7 @@ int live_command(const live_options &options)
 
 int send_command(const std::string &device, const std::vector<std::string> &words)
 {
-    session s;
+    live_session s;
     scenario story;
     std::string error;
     player_options how;

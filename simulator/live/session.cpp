@@ -41,7 +41,7 @@ std::string why_now(const rig &r, const std::string &led_name)
     return why(history_of(trace), *led, trace.entries.size());
 }
 
-void report(session &s, const statement &at, const played &done)
+void report(live_session &s, const statement &at, const played &done)
 {
     s.failed += done.result == PLAY_FAILED;
     if (!s.typed) {
@@ -63,7 +63,7 @@ bool needs_daemon(const statement &s)
 }
 
 // False when the statement could not be played.
-bool play_next(session &s, const scenario &story, const statement &next)
+bool play_next(live_session &s, const scenario &story, const statement &next)
 {
     if (!s.p.device.launched && needs_daemon(next) && !play_text(s, "start", "start")) {
         return false;
@@ -75,7 +75,7 @@ bool play_next(session &s, const scenario &story, const statement &next)
 }
 
 // What the parser says of a text, with the session's number of the line; a person at a terminal needs none.
-std::string told(const session &s, const std::string &error, const std::string &name, int lines_before)
+std::string told(const live_session &s, const std::string &error, const std::string &name, int lines_before)
 {
     const size_t what = error.find(": ");
     if (s.typed) {
@@ -98,7 +98,7 @@ void shift_lines(std::vector<statement> &statements, int by)
 
 } // namespace
 
-void look_up(session &s)
+void look_up(live_session &s)
 {
     rig &r = s.p.device;
     std::string errors;
@@ -115,7 +115,7 @@ void look_up(session &s)
     s.told_end = gone;
 }
 
-std::string news(session &s)
+std::string news(live_session &s)
 {
     char *text = nullptr;
     size_t size = 0;
@@ -129,7 +129,7 @@ std::string news(session &s)
     return result;
 }
 
-bool play_story(session &s, const scenario &story)
+bool play_story(live_session &s, const scenario &story)
 {
     for (const statement &next : story.statements) {
         if (interrupt_signal != 0) {
@@ -142,7 +142,7 @@ bool play_story(session &s, const scenario &story)
     return true;
 }
 
-bool play_text(session &s, const std::string &text, const std::string &name)
+bool play_text(live_session &s, const std::string &text, const std::string &name)
 {
     scenario story;
     std::string error;
@@ -159,7 +159,7 @@ bool play_text(session &s, const std::string &text, const std::string &name)
     return play_story(s, story);
 }
 
-bool answer(session &s, const std::string &line)
+bool answer(live_session &s, const std::string &line)
 {
     std::vector<word> words;
     std::string error;

@@ -3,7 +3,7 @@
 
 #include "player.h"
 
-struct session {
+struct live_session {
     player p;
     bool typed = false;     // at a terminal: a statement that cannot be played is told, and no more
     int64_t failed = 0;     // expectations
@@ -13,15 +13,15 @@ struct session {
 };
 
 // Prints what has happened since it was last looked at.
-void look_up(session &s);
+void look_up(live_session &s);
 // The same as a text.
-std::string news(session &s);
+std::string news(live_session &s);
 
 // Plays statements, up to the first that cannot be read or played, or a signal. False when there is such one: what is
 // wrong has been told. A daemon that has never been started is, before the first statement that needs it. text: whole
 // lines, the last of them that of the session; name: what stands for a file in front of their numbers.
-bool play_story(session &s, const scenario &story);
-bool play_text(session &s, const std::string &text, const std::string &name);
+bool play_story(live_session &s, const scenario &story);
+bool play_text(live_session &s, const std::string &text, const std::string &name);
 
 // Answers help, leds and why. False when the line is none of them.
-bool answer(session &s, const std::string &line);
+bool answer(live_session &s, const std::string &line);
