@@ -74,6 +74,11 @@ bool is_message_timer(const breach &what)
             is_excused(SWITCHED_ON_ASLEEP | MESSAGE_TIMER_LEFT));
 }
 
+bool is_message_led(const breach &what)
+{
+    return what.led == LED_SMS_BLUE && (is_look(what, {led_mode::ON, 4, 0, 0}) || world.asleep != 0);
+}
+
 // Going off in earnest deletes both.
 bool is_idle_reminder(const breach &what)
 {
@@ -81,16 +86,21 @@ bool is_idle_reminder(const breach &what)
            (world.power == POWER_OFF_UNREAL || world.asleep != 0 || world.call_up == 0);
 }
 
-// Switched on before the night's beginning or end was noticed.
-bool is_as_before_the_night(const breach &what)
+// In the night or the morning after it; or switched on before the night's beginning or end was noticed.
+bool is_left_by_the_night(const breach &what)
 {
-    return !what.restarted && (what.shown == 0) != is_night();
+    return what.broken == NIGHT_IS_DIM || (!what.restarted && (what.shown == 0) != is_night());
 }
 
 bool is_alarm(const breach &what)
 {
     return what.led == LED_SIG_BLUE &&
            (look_at(what.shown).mode == led_mode::BLINK || look_at(what.due).mode == led_mode::BLINK);
+}
+
+bool is_kept_without_bars(const breach &what)
+{
+    return what.led == LED_SIG_BLUE && what.due == 0 && what.restarted && nv_is("nv/signalbar", "0");
 }
 
 bool is_pairing()
@@ -134,7 +144,7 @@ constexpr oddity oddity_rows[] = {
      "Switched on again while a new message blinks, the device shows the message anew and starts a second timer; "
      "the first one runs on and nobody can stop it. The charging and the quick ways of switching off let it run too."},
     {"message-lights-a-dark-device", A_HANDHELD, OFF | SLEEP,
-     [](const breach &what) { return what.led == LED_SMS_BLUE && (is_look(what, {led_mode::ON, 4, 0, 0}) || world.asleep != 0); },
+     [](const breach &what) { return is_message_led(what); },
      "Ten seconds after a message the timer lights the message LED steadily, also on a device that has gone off or "
      "to sleep meanwhile in a way that lets the timer run."},
     {"reminder-runs-on-while-off", A_HANDHELD, TIMERS,
@@ -166,11 +176,12 @@ constexpr oddity oddity_rows[] = {
      "as awake, but Wi-Fi stays dark until the next wake-up."},
     {"suspended-night-goes-on", A_HANDHELD | A_MODULE | A_SINGLE_CHIP, HEALS,
      [](const breach &what) { return is_night() && is_gated_at_night(what.led) && nv_is("nv/night_mode_switch", "2"); },
-     "Night mode is suspended in the middle of a night, and the night goes on: only a restart, or the morning, ends it."},
+     "Night mode is suspended in the middle of a night, and the night goes on: only a restart, or the morning, "
+     "ends it."},
     {"settings-read-at-the-start", A_HANDHELD | A_MODULE | A_SINGLE_CHIP, bit(FAILURES_HEAL),
      [](const breach &what) { return is_excused(SETTINGS_UNREAD) && is_gated_at_night(what.led); },
-     "When the settings of the night or of the temperature alarm cannot be read, or their timers not started, at the start, "
-     "they stay without effect: switching off and on reads neither, only a restart or their commands do."},
+     "When the settings of the night or of the temperature alarm cannot be read, or their timers not started, at the "
+     "start, they stay without effect: switching off and on reads neither, only a restart or their commands do."},
     {"net-change-asleep", ANY_PRODUCT & ~A_MODULE, NOISE,
      [](const breach &what) { return world.asleep != 0 && (said(what, "NETTYPE") || said(what, "PPP")); },
      "While asleep every network or data-call notification switches the dark net LEDs off once more."},
@@ -210,7 +221,7 @@ constexpr oddity oddity_rows[] = {
      "A module terminal that has been switched off shows its network all the same: switching everything off leaves "
      "net_14 and net_16 out."},
     {"module-has-no-night", A_MODULE, NIGHTS | HEALS,
-     [](const breach &what) { return is_of(what, MODULE_NET) && (what.broken == NIGHT_IS_DIM || is_as_before_the_night(what)); },
+     [](const breach &what) { return is_of(what, MODULE_NET) && is_left_by_the_night(what); },
      "The night does not reach what a module terminal shows: its relight is refused, because the terminal keeps a "
      "power state of its own. What was lit stays lit until it changes."},
     {"module-without-5g", A_MODULE, HEALS,
@@ -251,9 +262,9 @@ constexpr oddity oddity_rows[] = {
      "Switched off and on again, a single-chip terminal shows neither network nor signal: both are the ones that it "
      "remembers, so it takes them for shown."},
     {"single-chip-starts-without-bars", A_SINGLE_CHIP, HEALS,
-     [](const breach &what) { return what.led == LED_SIG_BLUE && what.due == 0 && what.restarted && nv_is("nv/signalbar", "0"); },
-     "A killed daemon leaves the signal LED of a single-chip terminal lit. When no bars are left, the next one starts with "
-     "that level, takes it for shown and leaves the LED as it is."},
+     [](const breach &what) { return is_kept_without_bars(what); },
+     "A killed daemon leaves the signal LED of a single-chip terminal lit. When no bars are left, the next one starts "
+     "with that level, takes it for shown and leaves the LED as it is."},
     {"refused-request-remembered", A_DATA_CARD | A_SINGLE_CHIP, bit(FAILURES_HEAL),
      [](const breach &what) { return is_net_or_signal(what) || what.led == LED_SIG_6; },
      "The board refuses a request for the signal or net LED. The daemon takes it for shown all the same, and so does "

@@ -176,25 +176,25 @@ written this page and the scenarios of the oddities; a test keeps them current. 
 
 %s
 Where each is checked: 1 to 5 and 7 in every state, 6 from every state, 8 after every indication, and the morning of 5
-after every end of a night. In a search with faults only 9 and 10 are: what a refused call leaves unlit or lit is no breach
-until a power cycle has left it so. 9 is checked from every state of those searches, after any number of faults: refused
-LED requests, timers, NV reads and battery queries. 10 needs all states to be known, so that it is checked in the searches
-that have seen every state, and in no other. A walk checks 1 to 5 and 7 after every step and 6 after every fiftieth; with
-faults it checks 9 there and nothing else.
+after every end of a night. In a search with faults only 9 and 10 are: what a refused call leaves unlit or lit is no
+breach until a power cycle has left it so. 9 is checked from every state of those searches, after any number of
+faults: refused LED requests, timers, NV reads and battery queries. 10 needs all states to be known, so that it is
+checked in the searches that have seen every state, and in no other. A walk checks 1 to 5 and 7 after every step and 6
+after every fiftieth; with faults it checks 9 there and nothing else.
 
 ## The oddities
 
-Where the described behaviour itself breaks a property, and how few steps it takes to see it. Each is a scenario of its
-name in `scenarios/oddities/`, the shortest there is.
+Where the described behaviour itself breaks a property, and how few steps it takes to see it. Each is a scenario of
+its name in `scenarios/oddities/`, the shortest there is.
 
 %s
 ## What was explored
 
 "Every state" means that there are no others: each stimulus leads from each of them to one of them. Otherwise every
-history up to that number of steps was played, and nothing is known of longer ones but what the walks have met. A value in
-NV changes together with its notification, the clock stands at noon or at 23:00, and a timer may fire whenever it runs.
-Power, sleep, the night's beginning and end, heat, relights and restarts are part of every search. Walks are random but
-the same every time. `--states 0` goes on to the last state wherever memory and patience allow.
+history up to that number of steps was played, and nothing is known of longer ones but what the walks have met. A
+value in NV changes together with its notification, the clock stands at noon or at 23:00, and a timer may fire
+whenever it runs. Power, sleep, the night's beginning and end, heat, relights and restarts are part of every search.
+Walks are random but the same every time. `--states 0` goes on to the last state wherever memory and patience allow.
 
 %s)";
 
