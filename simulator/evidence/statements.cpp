@@ -184,7 +184,7 @@ std::string printable(std::string_view text)
 {
     std::string shown(text);
     std::replace_if(
-        shown.begin(), shown.end(), [](char c) { return (c >= 0 && c < ' ') || c == 0x7f; }, '?');
+        shown.begin(), shown.end(), [](unsigned char c) { return c < 0x20 || c == 0x7f; }, '?');
     return shown;
 }
 

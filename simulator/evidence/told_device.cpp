@@ -129,7 +129,7 @@ std::string clock_statement(int64_t seconds)
 {
     std::array<char, 64> text;
     std::tm utc = {};
-    const std::time_t moment = seconds;
+    const auto moment = static_cast<std::time_t>(seconds);
     gmtime_r(&moment, &utc);
     strftime(text.data(), text.size(), "clock %Y-%m-%d %H:%M:%S\n", &utc);
     return text.data();
