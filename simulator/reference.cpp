@@ -124,7 +124,8 @@ bool ask(player &p, const product_name &product, const std::vector<stimulus> &st
     return true;
 }
 
-bool ask_all(unsigned asked, daemon_options options, const std::vector<stimulus> &stimuli, std::vector<found> &all)
+bool ask_all(unsigned asked, const daemon_options &options, const std::vector<stimulus> &stimuli,
+             std::vector<found> &all)
 {
     for (const product_name &product : all_products()) {
         if (!(asked & product.mask)) {

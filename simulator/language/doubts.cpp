@@ -25,6 +25,7 @@ void doubt(doubting &d, const statement &s, const std::string &what)
 std::string nearest_key(std::string_view key)
 {
     std::vector<std::string_view> known;
+    known.reserve(nv_words().size());
     for (const nv_word &word : nv_words()) {
         known.push_back(word.key);
     }
@@ -34,6 +35,7 @@ std::string nearest_key(std::string_view key)
 std::string nearest_led(std::string_view name)
 {
     std::vector<std::string_view> known;
+    known.reserve(led_rows.size());
     for (const led_row &row : led_rows) {
         known.emplace_back(row.name);
     }
