@@ -1,6 +1,7 @@
 #include "evidence/syslog.h"
 
 #include "evidence/statements.h"
+#include "language/vocabulary.h"
 
 #include <algorithm>
 #include <array>
@@ -25,13 +26,23 @@ const std::regex &time_stamp()
     return pattern;
 }
 
-// NAME: and NAME[PID]: behind a host or a level; SOURCE:LINE of standard error; and of RFC 5424 HOST NAME PID ID DATA.
+// Any of the names that the daemon logs under, its own among them.
+std::string our_names()
+{
+    std::string names;
+    for (const std::string_view source : log_sources()) {
+        names += (names.empty() ? "(?:" : "|") + std::string(source);
+    }
+    return names + ")";
+}
+
+// NAME: and NAME[PID]: behind a host or a level; NAME:LINE of standard error; and of RFC 5424 HOST NAME PID ID DATA.
 const std::regex &our_head()
 {
-    static const std::regex pattern(
-        "(?:[^ :]+ +){0,3}(?:[^ :]*/)?"
-        "(?:kiv_mirta_led(?:\\[[0-9]+\\])?:(?= |$)|kiv_(?:mirta_)?led[a-z0-9_]*:[0-9]+(?= |$)|"
-        "kiv_mirta_led [^ ]+ [^ ]+ (?:-|(?:\\[[^\\]]*\\])+)(?:\xef\xbb\xbf)?) *");
+    static const std::regex pattern("(?:[^ :]+ +){0,3}(?:[^ :]*/)?"
+                                    "(?:" +
+                                    our_names() + "(?:(?:\\[[0-9]+\\])?:(?= |$)|:[0-9]+(?= |$))|" +
+                                    "kiv_mirta_led [^ ]+ [^ ]+ (?:-|(?:\\[[^\\]]*\\])+)(?:\xef\xbb\xbf)?) *");
     return pattern;
 }
 

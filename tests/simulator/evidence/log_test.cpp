@@ -10,11 +10,11 @@
 
 namespace
 {
-using framing = std::function<std::string(const std::string &text)>;
+using framing = std::function<std::string(const std::string &source, const std::string &text)>;
 
 framing behind(const std::string &head)
 {
-    return [head](const std::string &text) { return head + text; };
+    return [head](const std::string &, const std::string &text) { return head + text; };
 }
 
 struct framing_case {
@@ -23,17 +23,21 @@ struct framing_case {
 };
 
 const framing_case framings[] = {
-    {"bare",                     behind("")                                                                    },
-    {"RFC 3164",                 behind("<30>Nov 22 20:15:04 cpe kiv_mirta_led[312]: ")                        },
-    {"RFC 3164, no PID",         behind("Nov  2 20:15:04 kiv_mirta_led: ")                                     },
-    {"RFC 5424",                 behind("<30>1 2026-11-22T20:15:04.01Z cpe kiv_mirta_led 312 - [a@1 b=\"c\"] ")},
-    {"journal, short-iso",       behind("2026-11-22T20:15:04+0100 cpe kiv_mirta_led[312]: ")                   },
-    {"journal, short-monotonic", behind("[  123.456789] cpe kiv_mirta_led[312]: ")                             },
-    {"logread",                  behind("Sun Nov 22 20:15:04 2026 daemon.info kiv_mirta_led[312]: ")           },
-    {"logread with a stamp",     behind("Sun Nov 22 20:15:04 2026 [99.123] daemon.info kiv_mirta_led[312]: ")  },
-    {"standard error",           behind("2026-11-22 20:15:04.123 INFO kiv_led_night_mode:90 ")                 },
+    {"bare", behind("")},
+    {"RFC 3164", behind("<30>Nov 22 20:15:04 cpe kiv_mirta_led[312]: ")},
+    {"RFC 3164, no PID", behind("Nov  2 20:15:04 kiv_mirta_led: ")},
+    {"RFC 5424", behind("<30>1 2026-11-22T20:15:04.01Z cpe kiv_mirta_led 312 - [a@1 b=\"c\"] ")},
+    {"journal, short-iso", behind("2026-11-22T20:15:04+0100 cpe kiv_mirta_led[312]: ")},
+    {"journal, short-monotonic", behind("[  123.456789] cpe kiv_mirta_led[312]: ")},
+    {"logread", behind("Sun Nov 22 20:15:04 2026 daemon.info kiv_mirta_led[312]: ")},
+    {"logread with a stamp", behind("Sun Nov 22 20:15:04 2026 [99.123] daemon.info kiv_mirta_led[312]: ")},
+    {"standard error", behind("2026-11-22 20:15:04.123 INFO kiv_led_night_mode:90 ")},
     {"standard error, journal",
-     behind("Nov 22 20:15:04 cpe kiv_mirta_led[9]: 2026-11-22 20:15:04.1 INFO kiv_mirta_led:9 ")               },
+     behind("Nov 22 20:15:04 cpe kiv_mirta_led[9]: 2026-11-22 20:15:04.1 INFO kiv_mirta_led:9 ")},
+    {"the source as the name",
+     [](const std::string &source, const std::string &text) {
+         return "Sun Nov 22 20:15:04 2026 daemon.info " + source + "[312]: " + text;
+     }},
 };
 
 // What the daemon logged in a recording, with lines of another process in between that speak of the same things.
@@ -42,7 +46,7 @@ std::string log_of(const recording &trace, const framing &frame)
     std::string log;
     for (const trace_entry &entry : trace.entries) {
         if (entry.call == "kiv_syslog_append") {
-            log += frame(log_text(entry)) + "\n";
+            log += frame(quoted_texts(entry.arguments).at(0), log_text(entry)) + "\n";
             log += "Nov 22 20:15:04 cpe ledtest[7]: kiv_mirta_led: enter kiv_led_set_net_led_off\n";
         }
     }
