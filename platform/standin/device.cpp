@@ -173,10 +173,10 @@ static int read_some(int fd, char *buffer, int size)
         if (got < 0) {
             return -1;
         }
-        if (got == 0) {
-            break;
-        }
         length += static_cast<int>(got);
+        if (length < size) {
+            break; // a file ends where it gives less than it is asked for
+        }
     }
     return length;
 }

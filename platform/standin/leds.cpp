@@ -35,8 +35,7 @@ struct attribute {
 struct led {
     char folder[FOLDER_NAME_SIZE]; // "": the board has no such LED
     int highest;                   // max_brightness; 0 until the folder has been seen
-    dev_t device;                  // the folder that the attributes were opened in
-    ino_t inode;
+    int held = -1;                 // the folder that the attributes were opened in, when it is ours
     timespec changed;
     std::array<attribute, ATTRIBUTE_COUNT> attributes;
 };
@@ -96,6 +95,10 @@ static void forget_led(led &one)
         }
         file = {};
     }
+    if (one.held >= 0) {
+        close(one.held);
+    }
+    one.held = -1;
     one.highest = 0;
 }
 
@@ -224,21 +227,13 @@ static int make_led(const led &one)
     return result == 0 ? LED_LEVEL_MAX : result;
 }
 
-// What is replaced in a folder changes the folder's time; another folder has another inode, or the file that we hold
-// has no name any more.
+// A folder that is removed has no name any more; one that is put aside, or in which something is replaced, has changed.
 static bool is_same_folder(const led &one)
 {
     struct stat folder {
     };
-    struct stat file {
-    };
-    if (fstatat(led_dir, one.folder, &folder, AT_SYMLINK_NOFOLLOW) != 0 || folder.st_dev != one.device ||
-        folder.st_ino != one.inode || folder.st_mtim.tv_sec != one.changed.tv_sec ||
-        folder.st_mtim.tv_nsec != one.changed.tv_nsec) {
-        return false;
-    }
-    const int fd = one.attributes[BRIGHTNESS].fd;
-    return fd < 0 || (fstat(fd, &file) == 0 && file.st_nlink > 0);
+    return fstat(one.held, &folder) == 0 && folder.st_nlink > 0 && folder.st_ctim.tv_sec == one.changed.tv_sec &&
+           folder.st_ctim.tv_nsec == one.changed.tv_nsec;
 }
 
 // Finds the LED's folder and its highest brightness, again when the folder is another one. Returns 0 or a negative
@@ -260,10 +255,11 @@ static int find_led(led &one)
     if (one.highest < 0) {
         return one.highest;
     }
-    if (fstatat(led_dir, one.folder, &folder, AT_SYMLINK_NOFOLLOW) == 0) {
-        one.device = folder.st_dev;
-        one.inode = folder.st_ino;
-        one.changed = folder.st_mtim;
+    if (led_dir_is_ours) {
+        one.held = openat(led_dir, one.folder, O_RDONLY | O_DIRECTORY | O_CLOEXEC | O_NOFOLLOW);
+    }
+    if (one.held >= 0 && fstat(one.held, &folder) == 0) {
+        one.changed = folder.st_ctim;
     }
     return 0;
 }
