@@ -135,8 +135,8 @@ std::string explain_failure(const player &p, const statement &s, const std::stri
     }
     std::string text = place(*p.story, s.file, s.line) + ": expected: " + expected + "\n  shown:    " + shown + "\n" +
                        how_it_came_here(p, s) + "  at " + seconds(r.now_ns / 1000) +
-                       " s of device time, the clock shows " + wall_clock(r) + "\n  the front: " + lit_leds(r.state) +
-                       "\n";
+                       " s of device time, the clock shows " + wall_clock(r) +
+                       "\n  the front: " + lit_leds(r.state.leds) + "\n";
     for (size_t at = 0; at < leds.size() && at < LEDS_TOLD; at++) {
         text += requests_of(r.state, leds[at]);
     }

@@ -58,7 +58,7 @@ void observe_all(telling &in, size_t from, size_t to)
 // The LEDs that show something else than before, or that nothing was asked for.
 void expect(telling &in, size_t from, size_t to)
 {
-    const std::array<led_look, LED_ID_COUNT> before = in.state.leds;
+    const led_looks before = in.state.leds;
     bool changed = false;
     observe_all(in, from, to);
     for (int led = 0; led < LED_ID_COUNT; led++) {

@@ -342,15 +342,8 @@ std::string keep(const session &s)
     if (!r.launched) {
         return text;
     }
-    std::string lit;
-    for (int led = 0; led < LED_ID_COUNT; led++) {
-        const led_look &look = r.state.leds[static_cast<size_t>(led)];
-        if (is_lit(look)) {
-            lit += (lit.empty() ? "" : " and ") + std::string(led_name(led)) + " " + describe(look);
-        }
-    }
     text += r.process.pid < 0 ? "expect ended\n" : "";
-    return text + (lit.empty() ? "expect dark\n" : "expect only " + lit + "\n");
+    return text + expect_lit(r.state.leds) + "\n";
 }
 
 const product_name *product_of(const session &s)

@@ -24,7 +24,7 @@ bool only_holds(const expectation &wanted, const observed &state, std::string &s
     for (size_t led = 0; led < all.size(); led++) {
         same &= seen(all[led]) == seen(state.leds[led]);
     }
-    shown = lit_leds(state);
+    shown = lit_leds(state.leds);
     return same;
 }
 

@@ -118,16 +118,22 @@ led_look seen(const led_look &look)
     return look.brightness == 0 ? led_look{} : look;
 }
 
-std::string lit_leds(const observed &state)
+std::string lit_leds(const led_looks &leds)
 {
     std::string list;
     for (int led = 0; led < LED_ID_COUNT; led++) {
-        const led_look look = seen(state.leds[static_cast<size_t>(led)]);
+        const led_look look = seen(leds[static_cast<size_t>(led)]);
         if (look.mode != led_mode::OFF) {
             list += (list.empty() ? "" : " and ") + std::string(led_name(led)) + " " + describe(look);
         }
     }
     return list.empty() ? "dark" : list;
+}
+
+std::string expect_lit(const led_looks &leds)
+{
+    const std::string lit = lit_leds(leds);
+    return lit == "dark" ? "expect dark" : "expect only " + lit;
 }
 
 std::string describe(const led_look &look)

@@ -38,8 +38,10 @@ struct watched_fault {
     bool hit = false;
 };
 
+using led_looks = std::array<led_look, LED_ID_COUNT>; // by id
+
 struct observed {
-    std::array<led_look, LED_ID_COUNT> leds = {};
+    led_looks leds = {};
     std::map<int64_t, running_timer> timers;
     std::vector<trace_entry> step; // since the last stimulus; of entries alike but for their time the first
     std::unordered_set<std::string> step_calls;
@@ -56,6 +58,7 @@ void observe(observed &state, const trace_entry &entry);
 void begin_step(observed &state);
 void forget_process(observed &state); // it is gone, and its timers with it; the LEDs stay as they are
 
-led_look seen(const led_look &look);         // to the eye, an LED that is on at brightness 0 is off
-std::string lit_leds(const observed &state); // "bat_green on 4 and net_red on 2", or "dark"
-std::string describe(const led_look &look);  // "on 4", "off", "blink 800/1200 4"
+led_look seen(const led_look &look);           // to the eye, an LED that is on at brightness 0 is off
+std::string lit_leds(const led_looks &leds);   // "bat_green on 4 and net_red on 2", or "dark"
+std::string expect_lit(const led_looks &leds); // "expect only bat_green on 4 and net_red on 2", or "expect dark"
+std::string describe(const led_look &look);    // "on 4", "off", "blink 800/1200 4"
