@@ -15,6 +15,7 @@ namespace
 {
 constexpr int64_t US_PER_S = 1'000'000;
 constexpr const char *MISSING = "missing";
+constexpr const char *MISSING_ITEM = " missing";
 
 // A value of the device as a statement sets it: "nv battery_value=", "sensor 3 ".
 struct setting {
@@ -49,10 +50,10 @@ std::optional<setting> setting_of(const trace_entry &entry)
         const std::string item = entry.arguments.substr(0, entry.arguments.find(','));
         const size_t behind = entry.result.find(", ");
         if (behind == std::string::npos) {
-            return setting{"cfg " + item + " ", MISSING};
+            return setting{"cfg " + item, MISSING_ITEM};
         }
         const bool text = entry.result.find('"') != std::string::npos;
-        return setting{"cfg " + item + "=", text ? answer_text(entry) : entry.result.substr(behind + 2)};
+        return setting{"cfg " + item, "=" + (text ? answer_text(entry) : entry.result.substr(behind + 2))};
     }
     if (entry.call == "kiv_bsp_get_sensor_temp_sync") {
         return setting{"sensor " + entry.arguments + " ", answer_numbers(entry)};
@@ -76,7 +77,10 @@ std::optional<setting> setting_of(const trace_entry &entry)
 std::string value_in(const told_device &device, const std::string &statement)
 {
     const auto known = device.values.find(statement);
-    return known != device.values.end() ? known->second : statement == "cfg 531=" ? "1" : MISSING;
+    if (known != device.values.end()) {
+        return known->second;
+    }
+    return statement == "cfg 531" ? "=1" : statement.starts_with("cfg ") ? MISSING_ITEM : MISSING;
 }
 
 // The statement that makes a call fail as an entry did.
@@ -138,7 +142,7 @@ std::string clock_statement(int64_t seconds)
 std::string statement_of(const setting &one)
 {
     for (const product_name &product : all_products()) {
-        if (one.statement == "cfg 6000=" && one.value == product.cfg_text) {
+        if (one.statement == "cfg 6000" && one.value == "=" + std::string(product.cfg_text)) {
             return "product " + std::string(product.name);
         }
     }
