@@ -142,6 +142,10 @@ void greet(const live_session &s)
                r.state.started ? "runs" : "waits for its start record",
                r.trace_path.empty() ? "; without KIV_TRACE only its LEDs are seen" : "");
     }
+    if (s.typed && r.process.under) {
+        printf("the program around the daemon gets no input, as this session has the terminal; 'gdb -ex run --args'\n"
+               "needs none, and 'live --device' takes a daemon that a debugger holds at another terminal\n");
+    }
     if (s.typed) {
         printf("help lists the statements, control-D ends the session\n");
     }
