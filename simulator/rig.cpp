@@ -123,7 +123,7 @@ bool pass_virtual_time(rig &r, int64_t until_ns, std::string &error)
 bool is_at_rest(const rig &r)
 {
     const pid_t daemon = daemon_pid(r.process);
-    if ((r.attached || r.process.under) && what_it_does(daemon) == activity::HELD) {
+    if ((r.attached || r.process.under) && what_it_does(daemon) == process_activity::HELD) {
         return true; // a debugger has it; nobody knows for how long
     }
     return r.wires.pending.empty() && r.wires.in_queue == 0 && waits_for_message(daemon);

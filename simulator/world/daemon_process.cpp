@@ -213,10 +213,10 @@ bool is_patient(patience &left, daemon_process &process)
     }
     std::error_code failure;
     const uintmax_t size = fs::file_size(process.trace_path, failure);
-    const activity doing = what_it_does(process.pid);
+    const process_activity doing = what_it_does(process.pid);
     const bool grown = size != std::exchange(left.trace_size, size);
-    left.silent_ms = grown || doing == activity::HELD ? 0 : left.silent_ms + LOOK_EVERY_MS;
-    left.asleep_ms = grown || doing != activity::ASLEEP ? 0 : left.asleep_ms + LOOK_EVERY_MS;
+    left.silent_ms = grown || doing == process_activity::HELD ? 0 : left.silent_ms + LOOK_EVERY_MS;
+    left.asleep_ms = grown || doing != process_activity::ASLEEP ? 0 : left.asleep_ms + LOOK_EVERY_MS;
     if (left.asleep_ms < ASLEEP_MS && left.silent_ms < SILENT_MS) {
         return true;
     }

@@ -94,16 +94,16 @@ std::string place_of(const fs::path &task)
 }
 } // namespace
 
-activity what_it_does(pid_t pid)
+process_activity what_it_does(pid_t pid)
 {
-    activity doing = activity::ASLEEP;
+    process_activity doing = process_activity::ASLEEP;
     for (const fs::path &task : tasks_of(pid)) {
         const char state = state_of(task);
         if (state == 'T' || state == 't') {
-            return activity::HELD;
+            return process_activity::HELD;
         }
         if (state != 'S' || !first_line(task / "children").empty()) {
-            doing = activity::BUSY;
+            doing = process_activity::BUSY;
         }
     }
     return doing;

@@ -5,13 +5,13 @@
 #include <string>
 #include <sys/types.h>
 
-enum class activity {
+enum class process_activity {
     ASLEEP, // every thread waits for something, and no shell command runs
     BUSY,
     HELD, // stopped, or by a debugger
 };
 
-activity what_it_does(pid_t pid);
+process_activity what_it_does(pid_t pid);
 
 // True while one of its threads waits in a receive; also when the kernel does not tell.
 bool waits_for_message(pid_t pid);
