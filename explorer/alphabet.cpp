@@ -11,16 +11,9 @@
 
 namespace
 {
-// Products as bits.
-constexpr unsigned ON_UFI = 1U << UFI;
-constexpr unsigned ON_DATA_CARD = 1U << DATA_CARD;
-constexpr unsigned ON_PAPER_KITE = 1U << PAPER_KITE;
-constexpr unsigned ON_MODULE = 1U << MODULE;
-constexpr unsigned ON_UNI_CORE = 1U << UNI_CORE;
 constexpr unsigned ON_POWERED = ON_UFI | ON_MODULE | ON_UNI_CORE;
 constexpr unsigned ON_WIFI = ON_UFI | ON_PAPER_KITE | ON_UNI_CORE;
 constexpr unsigned ON_REMINDED = ON_WIFI;
-constexpr unsigned ON_EVERY = (1U << PRODUCTS) - 1;
 
 struct family_row {
     family of;
@@ -38,6 +31,7 @@ constexpr std::array family_rows = {
     family_row{CALLS,    ON_MODULE | ON_UNI_CORE,                "calls"   },
     family_row{NIGHT,    ON_EVERY,                               "night"   },
     family_row{FAULTS,   ON_EVERY,                               "faults"  },
+    family_row{REFUSALS, ON_EVERY,                               "refusals"},
 };
 
 struct stimulus_row {
@@ -88,7 +82,8 @@ constexpr stimulus_row stimulus_rows[] = {
     {ON_DATA_CARD | ON_MODULE, SIGNAL, "nv signalbar=9\nnotify NWINFO SIG_BAR"},
     {ON_EVERY, SIGNAL, "nv thermal_led_enable={60|0}\ncommand OVER_TEMP"},
 
-    {ON_WIFI, WIFI, "nv wifi_onoff_state={1|0} RadioOff={1|0}\nnotify WLAN CURRENT_STATUS {1|0}"},
+    {ON_UFI, WIFI, "nv wifi_onoff_state={1|0} RadioOff={1|0}\nnotify WLAN CURRENT_STATUS {1|0}"},
+    {ON_WIFI & ~ON_UFI, WIFI, "nv wifi_onoff_state={1|0}\nnotify WLAN CURRENT_STATUS {1|0}"},
     {ON_WIFI, WIFI, "notify WLAN CURRENT_STATUS 2"},
     {ON_PAPER_KITE | ON_UNI_CORE, WIFI, "nv wifi_chip1_wps_state={1|0}\nnotify WLAN AP_WPS_STATE {1|0}"},
     {ON_PAPER_KITE | ON_UNI_CORE, WIFI, "nv wifi_chip2_wps_state={1|0}\nnotify WLAN AP_WPS_STATE_CHIP2 {1|0}"},
@@ -108,8 +103,13 @@ constexpr stimulus_row stimulus_rows[] = {
 
     {ON_EVERY, FAULTS, "fail {kiv_bsp_set_leds_sync|kiv_timer} * {-1|0}"},
     {ON_EVERY, FAULTS, "fail kiv_nvconfig_read * -1"},
-    {ON_MODULE, FAULTS, "fail kiv_bsp_get_battery_online_status_sync * -1"},
     {ON_EVERY, FAULTS, "repair all"},
+
+    {ON_EVERY, REFUSALS, "fail {kiv_nvconfig_write|kiv_bsp_get_sensor_temp_sync} * -1"},
+    {ON_EVERY, REFUSALS, "fail {kiv_cfg_get_item|kiv_lib_led_relight_msg} * -1"},
+    {ON_MODULE, REFUSALS,
+     "fail kiv_bsp_get_battery_online_status_sync * -1\nfail kiv_bsp_get_charger_connect_status_sync * -1"},
+    {ON_EVERY, REFUSALS, "repair all"},
 };
 
 constexpr std::string_view DEVICE_AT_REST =
@@ -125,22 +125,21 @@ constexpr std::string_view DEVICE_AT_REST =
     "clock 12:00\n";
 // clang-format on
 
-[[noreturn]] void give_up(const std::string &why)
-{
-    fprintf(stderr, "kiv_led_explore: %s\n", why.c_str());
-    abort();
-}
-
 struct refusal_row {
     std::string_view call;
     refused_call refused;
 };
 
 constexpr std::array refusal_rows = {
-    refusal_row{"kiv_bsp_set_leds_sync",                  REFUSED_LEDS    },
-    refusal_row{"kiv_timer",                              REFUSED_TIMERS  },
-    refusal_row{"kiv_nvconfig_read",                      REFUSED_NV_READS},
-    refusal_row{"kiv_bsp_get_battery_online_status_sync", REFUSED_BATTERY },
+    refusal_row{"kiv_bsp_set_leds_sync",                   REFUSED_LEDS         },
+    refusal_row{"kiv_timer",                               REFUSED_TIMERS       },
+    refusal_row{"kiv_nvconfig_read",                       REFUSED_NV_READS     },
+    refusal_row{"kiv_nvconfig_write",                      REFUSED_NV_WRITES    },
+    refusal_row{"kiv_bsp_get_battery_online_status_sync",  REFUSED_SUPPLY       },
+    refusal_row{"kiv_bsp_get_charger_connect_status_sync", REFUSED_SUPPLY       },
+    refusal_row{"kiv_bsp_get_sensor_temp_sync",            REFUSED_SENSORS      },
+    refusal_row{"kiv_cfg_get_item",                        REFUSED_CONFIGURATION},
+    refusal_row{"kiv_lib_led_relight_msg",                 REFUSED_RELIGHT      },
 };
 
 uint8_t refused_bit(std::string_view call)

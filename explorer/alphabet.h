@@ -2,6 +2,7 @@
 #pragma once
 
 #include "daemon.h"
+#include "timers.h"
 
 #include <string>
 #include <string_view>
@@ -9,6 +10,13 @@
 
 // Products as names lists them.
 enum product_number : unsigned { UFI, DATA_CARD, PAPER_KITE, MODULE, UNI_CORE, PRODUCTS };
+// As bits.
+constexpr unsigned ON_UFI = 1U << UFI;
+constexpr unsigned ON_DATA_CARD = 1U << DATA_CARD;
+constexpr unsigned ON_PAPER_KITE = 1U << PAPER_KITE;
+constexpr unsigned ON_MODULE = 1U << MODULE;
+constexpr unsigned ON_UNI_CORE = 1U << UNI_CORE;
+constexpr unsigned ON_EVERY = (1U << PRODUCTS) - 1;
 
 enum family : unsigned {
     POWER = 1, // and sleep, the night's beginning and end, heat, a relight and a restart: part of every exploration
@@ -19,7 +27,9 @@ enum family : unsigned {
     MESSAGES = 32,
     CALLS = 64, // voicemail and the phone
     NIGHT = 128,
-    FAULTS = 256,
+    FAULTS = 256,   // refused LED requests, timers and NV reads
+    REFUSALS = 512, // of other calls of the platform
+    FAILURES = FAULTS | REFUSALS,
 };
 std::string family_names(unsigned families);
 

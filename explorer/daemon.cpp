@@ -100,7 +100,7 @@ void kill_daemon()
     world.asleep = 0;
     world.call_up = 0;
     world.restarting = 0;
-    world.excused = 0;
+    drop_excuse(~EXCUSES_OF_LEDS);
 }
 
 received received_of(const std::string &bytes)
@@ -115,7 +115,7 @@ void deliver_relights()
     static const received relight = received_of(command(KIV_MSG_CMD_LED_RELIGHT_MSG));
     while (happened.relights > 0) {
         happened.relights--;
-        world.excused = static_cast<uint8_t>(world.excused | (world.asleep != 0 ? RELIT_ASLEEP : 0));
+        excuse_by(world.asleep != 0 ? RELIT_ASLEEP : 0);
         messageParse(&relight.message);
     }
 }

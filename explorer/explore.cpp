@@ -65,15 +65,16 @@ found_state reach(searching &in, state_place place, const snapshot &from, size_t
 {
     static snapshot now;
     take_snapshot(now);
-    return same_snapshot(now, from) ? found_state{place, false} : add_state(in.store, place, step);
+    return same_snapshot(now, from) ? found_state{place, false} : add_state(in.store, now, place, step);
 }
 
-void take_step(searching &in, state_place place, const snapshot &from, size_t step)
+// Where the step leads; NO_STATE when it cannot be taken.
+state_place take_step(searching &in, state_place place, const snapshot &from, size_t step)
 {
     const stimulus &what = in.alphabet[step];
     const bool was_night = is_night();
     if (!apply(what, in.plan.product)) {
-        return;
+        return NO_STATE;
     }
     if (was_night && !is_night() && is_on_and_awake() && world.refused == 0 && !is_reminding()) {
         check_morning(in, place, step);
@@ -87,49 +88,20 @@ void take_step(searching &in, state_place place, const snapshot &from, size_t st
     if (reached.is_new) {
         check_new_state(in, reached.place);
     }
+    return reached.place;
 }
 
 void explore_state(searching &in, state_place place)
 {
     static snapshot from;
+    state_place earliest = NO_STATE;
     read_state(in.store, place, from);
     for (size_t step = 0; step < in.alphabet.size(); step++) {
         put_back(from);
-        take_step(in, place, from, step);
+        earliest = std::min(earliest, take_step(in, place, from, step));
     }
-}
-
-bool leads_to_a_mark(searching &in, state_place place)
-{
-    static snapshot from;
-    read_state(in.store, place, from);
-    for (size_t step = in.alphabet.size(); step-- > 0;) {
-        put_back(from);
-        if (apply(in.alphabet[step], in.plan.product) && is_marked(in.store, find_state(in.store))) {
-            return true;
-        }
-    }
-    return false;
-}
-
-// Marks every state that leads back to the first one; passes over the states until none is added.
-void check_traps(searching &in)
-{
-    bool added = true;
-    mark(in.store, 0);
-    while (added && is_interrupted == 0) {
-        added = false;
-        for (state_place at = 0; at < in.store.used; at = next_state(in.store, at)) {
-            if (!is_marked(in.store, at) && leads_to_a_mark(in, at)) {
-                mark(in.store, at);
-                added = true;
-            }
-        }
-    }
-    for (state_place at = 0; at < in.store.used && is_interrupted == 0; at = next_state(in.store, at)) {
-        if (!is_marked(in.store, at)) {
-            note(in, {.broken = NO_TRAP}, at, {}, "");
-        }
+    if (earliest >= place && place != 0) {
+        in.without_return.push_back(place);
     }
 }
 
@@ -187,13 +159,13 @@ search_result search(const search_plan &plan)
     furnish(plan.product);
     apply(stimulus_of("start"), plan.product);
     drop_unheard(in.alphabet);
-    check_new_state(in, add_state(in.store, NO_STATE, 0).place);
+    static snapshot first;
+    take_snapshot(first);
+    check_new_state(in, add_state(in.store, first, NO_STATE, 0).place);
     if (plan.steps != 0) {
         walk(in);
     } else {
         in.result.complete = explore_all(in);
-    }
-    if (in.result.complete) {
         check_traps(in);
     }
     in.result.plan = plan;

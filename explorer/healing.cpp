@@ -32,9 +32,9 @@ const led_picture &fresh_picture(power_cycles &cycles)
 }
 } // namespace
 
-std::string text_of(const power_cycle &cycle)
+std::string text_of(const power_cycle &cycle, bool after_failures)
 {
-    return cycle.off.text + cycle.on.text + "after 20s\n";
+    return (after_failures ? "repair all\n" : "") + cycle.off.text + cycle.on.text + "after 20s\n";
 }
 
 void open_power_cycles(power_cycles &cycles, unsigned product)
@@ -43,17 +43,17 @@ void open_power_cycles(power_cycles &cycles, unsigned product)
     const std::string on = has_switch ? "notify MAIN POWERON\n" : "";
     cycles.product = product;
     cycles.ways = {
-        {stimulus_of("repair all\nkill\n"), stimulus_of("start\n" + on), true}
+        {stimulus_of("kill\n"), stimulus_of("start\n" + on), true}
     };
     if (has_switch) {
-        cycles.ways.push_back(
-            {stimulus_of("repair all\nnotify SLEEP 0\nnotify MAIN SHUTTING_DOWN\n"), stimulus_of(on), false});
+        cycles.ways.push_back({stimulus_of("notify SLEEP 0\nnotify MAIN SHUTTING_DOWN\n"), stimulus_of(on), false});
     }
     open_store(cycles.switched_off);
 }
 
 void switch_off(const power_cycles &cycles, const power_cycle &cycle)
 {
+    world.refused = 0;
     apply(cycle.off, cycles.product);
 }
 
@@ -75,7 +75,7 @@ std::vector<breach> switch_on(power_cycles &cycles, const power_cycle &cycle)
 
 void restart_and_switch_on(const power_cycles &cycles)
 {
-    apply(cycles.ways.front().off, cycles.product);
+    switch_off(cycles, cycles.ways.front());
     apply(cycles.ways.front().on, cycles.product);
     pass_twenty_seconds();
 }

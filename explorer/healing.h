@@ -8,11 +8,11 @@
 
 // A way of switching off and on again.
 struct power_cycle {
-    stimulus off; // mended and awake
+    stimulus off; // awake
     stimulus on;
     bool restarts; // the daemon
 };
-std::string text_of(const power_cycle &cycle); // as a scenario says it
+std::string text_of(const power_cycle &cycle, bool after_failures); // as a scenario says it
 
 using led_picture = std::array<uint8_t, LED_ID_COUNT>;
 
@@ -25,6 +25,6 @@ struct power_cycles {
 };
 
 void open_power_cycles(power_cycles &cycles, unsigned product);
-void switch_off(const power_cycles &cycles, const power_cycle &cycle);
+void switch_off(const power_cycles &cycles, const power_cycle &cycle);         // nothing fails any more
 std::vector<breach> switch_on(power_cycles &cycles, const power_cycle &cycle); // what has not healed
 void restart_and_switch_on(const power_cycles &cycles);

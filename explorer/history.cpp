@@ -1,8 +1,10 @@
 #include "history.h"
 
 #include "language/words.h"
+#include "seen/observed.h"
 
 #include <algorithm>
+#include <sstream>
 
 namespace
 {
@@ -46,36 +48,12 @@ std::string as_duration(int64_t ms)
     return ms % 1000 == 0 ? std::to_string(ms / 1000) + "s" : std::to_string(ms) + "ms";
 }
 
-std::string as_text(const led_look &look)
-{
-    const std::string brightness = std::to_string(look.brightness);
-    if (look.mode == led_mode::ON) {
-        return "on " + brightness;
-    }
-    return "blink " + std::to_string(look.blink_time1) + "/" + std::to_string(look.blink_time2) + " " + brightness;
-}
-
-// All that is lit; LED by LED where one shines brighter than a scenario can say.
+// All that is lit.
 std::string as_expectation()
 {
-    constexpr int BRIGHTEST_SAID = 4;
-    std::string only;
-    std::string one_by_one;
-    bool is_sayable = true;
-    for (size_t led = 0; led < world.leds.size(); led++) {
-        if (!is_lit(world.leds[led])) {
-            continue;
-        }
-        const led_look &look = look_at(world.leds[led]);
-        const std::string lit = std::string(led_name(static_cast<int>(led))) + " " + as_text(look);
-        only += (only.empty() ? "expect only " : " and ") + lit;
-        if (look.brightness > BRIGHTEST_SAID) {
-            is_sayable = false;
-        } else {
-            one_by_one += "expect " + lit + "\n";
-        }
-    }
-    return !is_sayable ? one_by_one : (only.empty() ? "expect dark" : only) + "\n";
+    led_looks leds;
+    std::transform(world.leds.begin(), world.leds.end(), leds.begin(), look_at);
+    return expect_lit(leds) + "\n";
 }
 
 // Statements one by one, each as it stands; time passes by the clock.
@@ -144,6 +122,27 @@ std::string last_words(const breach &what)
 }
 } // namespace
 
+// What the device holds at rest, as far as the daemon has read it.
+static std::string needed_furniture(unsigned product)
+{
+    std::istringstream lines(furniture(product));
+    std::string needed;
+    for (std::string line; std::getline(lines, line);) {
+        std::istringstream words(line);
+        std::string what;
+        std::string kept;
+        words >> what;
+        for (std::string word; what == "nv" && words >> word;) {
+            kept += was_read("nv/" + word.substr(0, word.find('='))) ? " " + word : "";
+        }
+        const bool is_board = what == "battery" || what == "charger";
+        if (what != "nv" ? !is_board || was_read("bsp/" + what) : !kept.empty()) {
+            needed += (what == "nv" ? what + kept : line) + "\n";
+        }
+    }
+    return needed;
+}
+
 told_history tell_history(unsigned product, const std::vector<stimulus> &alphabet, const std::vector<size_t> &history,
                           const std::string &epilogue, const breach &what)
 {
@@ -151,7 +150,7 @@ told_history tell_history(unsigned product, const std::vector<stimulus> &alphabe
     bool is_played = true;
     furnish(product);
     timing = {};
-    told.text = furniture(product) + "start\n";
+    told.text = "start\n";
     apply(stimulus_of("start"), product);
     told.text += as_expectation();
     for (const size_t step : history) {
@@ -163,7 +162,7 @@ told_history tell_history(unsigned product, const std::vector<stimulus> &alphabe
         is_played &= play_step(stimulus_of(epilogue), product, told.text);
         told.text += as_expectation();
     }
-    told.text += last_words(what);
+    told.text = needed_furniture(product) + told.text + last_words(what);
     told.shows = is_played && shows(product, what);
     return told;
 }

@@ -18,8 +18,9 @@ struct explore_options {
     std::vector<std::string> products;
     std::vector<std::string> families;
     bool singles_only = false;
-    uint64_t most_states = 5'000'000; // of one family; a pair is given less
-    uint64_t steps = 10'000'000;      // ten walks: a hundred million
+    uint64_t most_states = 0; // of one family
+    uint64_t most_of_a_pair = 400'000;
+    uint64_t steps = 10'000'000; // ten walks: a hundred million
     unsigned jobs = 1;
     std::string document;
     std::string scenarios;
@@ -47,7 +48,7 @@ bool is_wanted(const std::vector<std::string> &list, std::string_view name)
 std::vector<unsigned> wanted_families(const explore_options &options, unsigned product)
 {
     std::vector<unsigned> wanted;
-    for (unsigned of = BATTERY; of <= FAULTS; of <<= 1) {
+    for (unsigned of = BATTERY; of <= REFUSALS; of <<= 1) {
         if ((families_of(product) & of) != 0 && is_wanted(options.families, family_names(of))) {
             wanted.push_back(of);
         }
@@ -58,9 +59,6 @@ std::vector<unsigned> wanted_families(const explore_options &options, unsigned p
 void plan_product(const explore_options &options, unsigned product, std::vector<job> &jobs)
 {
     const std::vector<unsigned> families = wanted_families(options, product);
-    constexpr uint64_t SHARE_OF_A_PAIR = 25;
-    const uint64_t most_of_a_pair =
-        options.most_states == 0 ? 0 : std::max(options.most_states / SHARE_OF_A_PAIR, uint64_t{1});
     const auto add = [&](unsigned of, uint64_t most_states, uint64_t steps = 0) {
         jobs.emplace_back().plan = {
             .product = product, .families = POWER | of, .most_states = most_states, .steps = steps};
@@ -76,11 +74,11 @@ void plan_product(const explore_options &options, unsigned product, std::vector<
     }
     for (size_t first = 0; first < families.size(); first++) {
         for (size_t second = first + 1; second < families.size(); second++) {
-            add(families[first] | families[second], most_of_a_pair);
+            add(families[first] | families[second], options.most_of_a_pair);
         }
     }
     if (options.steps != 0 && options.families.empty()) {
-        add(families_of(product) & ~FAULTS, 0, options.steps);
+        add(families_of(product) & ~FAILURES, 0, options.steps);
         add(families_of(product), 0, options.steps);
     }
 }
@@ -195,7 +193,7 @@ std::vector<std::string> names_of_products()
 std::vector<std::string> names_of_families()
 {
     std::vector<std::string> names;
-    for (unsigned of = POWER; of <= FAULTS; of <<= 1) {
+    for (unsigned of = POWER; of <= REFUSALS; of <<= 1) {
         names.push_back(family_names(of));
     }
     return names;
@@ -213,7 +211,9 @@ int main(int argc, char **argv)
     app.add_option("--family", options.families, "With these families of events only; may be repeated")
         ->check(CLI::IsMember(names_of_families()));
     app.add_flag("--single", options.singles_only, "Each family by itself: no pairs of them, no walks");
-    app.add_option("--states", options.most_states, "A search ends with the level that exceeds them; 0 never does");
+    app.add_option("--states", options.most_states,
+                   "The search of a family ends with the level that exceeds them; 0, the default, never does");
+    app.add_option("--pair-states", options.most_of_a_pair, "The same for a pair of families");
     app.add_option("--steps", options.steps, "Steps of each walk at random, two for a product; 0 for none");
     app.add_option("--jobs", options.jobs, "Searches at once")->check(CLI::Range(1U, 64U));
     app.add_option("--document", options.document, "Write what was found, as a page, to this file");

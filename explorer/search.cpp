@@ -12,7 +12,7 @@ std::string name_of(const breach &what)
 
 bool is_after_failures(const searching &in)
 {
-    return (in.plan.families & FAULTS) != 0;
+    return (in.plan.families & FAILURES) != 0;
 }
 
 static std::vector<size_t> history_of(const searching &in, state_place place)
@@ -61,13 +61,15 @@ void check_here(searching &in, state_place place)
 void check_healing(searching &in, state_place place)
 {
     static snapshot state;
+    static snapshot off;
     take_snapshot(state);
     for (const power_cycle &cycle : in.cycles.ways) {
         switch_off(in.cycles, cycle);
-        if (add_state(in.cycles.switched_off, NO_STATE, 0).is_new) {
+        take_snapshot(off);
+        if (add_state(in.cycles.switched_off, off, NO_STATE, 0).is_new) {
             for (breach what : switch_on(in.cycles, cycle)) {
                 what.broken = is_after_failures(in) ? FAILURES_HEAL : HEALING;
-                note(in, what, place, {}, text_of(cycle));
+                note(in, what, place, {}, text_of(cycle, is_after_failures(in)));
             }
         }
         put_back(state);

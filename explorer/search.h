@@ -10,7 +10,8 @@ struct searching {
     search_plan plan;
     std::vector<stimulus> alphabet;
     state_store store;
-    std::vector<size_t> path; // of a walk, from the first state
+    std::vector<state_place> without_return; // no single step leads from them to a state that was found before them
+    std::vector<size_t> path;                // of a walk, from the first state
     power_cycles cycles;
     search_result result;
     std::chrono::steady_clock::time_point since;
@@ -26,4 +27,5 @@ void check_here(searching &in, state_place place);
 void check_healing(searching &in, state_place place);
 void report_progress(const searching &in, state_place at);
 
-void walk(searching &in); // everything together, at random but the same on every run
+void check_traps(searching &in); // when all states of a search are found
+void walk(searching &in);        // everything together, at random but the same on every run

@@ -1,5 +1,6 @@
 #include "store.h"
 
+#include <algorithm>
 #include <cstdio>
 #include <cstdlib>
 #include <cstring>
@@ -11,44 +12,46 @@ constexpr size_t RESERVED = size_t{16} << 30;
 constexpr size_t FIRST_TABLE = size_t{1} << 12;
 constexpr unsigned TAG_BITS = 24;
 constexpr uint64_t TAG_MASK = (uint64_t{1} << TAG_BITS) - 1;
-constexpr size_t FIXED_BYTES = 10;
-constexpr size_t SKIP_MOST = 255;
+constexpr size_t HEAD_BYTES = 10;
 
-// How a state lies in memory, without gaps; its difference follows.
+// How a state lies in memory, without gaps; its columns follow.
 struct state_head {
-    uint16_t size; // of the difference
+    uint16_t size; // of the columns
     uint8_t stimulus;
-    uint8_t marked;
-    uint8_t parent[6]; // its place and 1; 0 for the first state
+    uint8_t parent[7]; // its place and 1; 0 for the first state
 };
-static_assert(sizeof(state_head) == FIXED_BYTES);
+static_assert(sizeof(state_head) == HEAD_BYTES);
 
-// Every byte that differs: how many bytes are skipped before it (255: and no byte follows), and the byte.
-struct difference {
-    std::array<std::byte, 2 * SNAPSHOT_MAX> bytes;
+// A state's bytes in the columns, up to the last one that differs from the first state's: columns that are found later
+// change nothing in it.
+struct column_bytes {
+    std::array<std::byte, SNAPSHOT_MAX> bytes;
     size_t size;
 };
 
-#define ALL_BYTES __attribute__((no_sanitize("address", "undefined"), noinline))
-
-ALL_BYTES void compare(const snapshot &first, const snapshot &now, size_t size, difference &out)
+uint64_t word_at(const snapshot &of, size_t at)
 {
-    size_t skipped_from = 0;
-    out.size = 0;
-    for (size_t word = 0; word < size; word += sizeof(uint64_t)) {
-        if (memcmp(first.bytes.data() + word, now.bytes.data() + word, sizeof(uint64_t)) == 0) {
-            continue;
-        }
-        for (size_t at = word; at < word + sizeof(uint64_t); at++) {
-            if (first.bytes[at] == now.bytes[at]) {
-                continue;
-            }
-            for (; at - skipped_from >= SKIP_MOST; skipped_from += SKIP_MOST) {
-                out.bytes[out.size++] = std::byte{SKIP_MOST};
-            }
-            out.bytes[out.size++] = static_cast<std::byte>(at - skipped_from);
-            out.bytes[out.size++] = now.bytes[at];
-            skipped_from = at + 1;
+    uint64_t word;
+    memcpy(&word, of.bytes.data() + at, sizeof word);
+    return word;
+}
+
+bool differs_outside_columns(const state_store &store, const snapshot &now)
+{
+    const size_t size = snapshot_size();
+    uint64_t differing = 0;
+    for (size_t at = 0; at < size; at += sizeof differing) {
+        differing |= (word_at(store.first, at) ^ word_at(now, at)) & word_at(store.constant, at);
+    }
+    return differing != 0;
+}
+
+void add_columns(state_store &store, const snapshot &now)
+{
+    for (size_t at = 0; at < snapshot_size(); at++) {
+        if (store.first.bytes[at] != now.bytes[at] && store.constant.bytes[at] != std::byte{0}) {
+            store.constant.bytes[at] = std::byte{0};
+            store.columns.push_back(static_cast<uint16_t>(at));
         }
     }
 }
@@ -72,12 +75,12 @@ state_head head_at(const state_store &store, state_place place)
     return head;
 }
 
-const std::byte *difference_at(const state_store &store, state_place place)
+const std::byte *columns_at(const state_store &store, state_place place)
 {
     return store.memory + place + sizeof(state_head);
 }
 
-// The slot of the difference, or the free one where it belongs.
+// The slot of a state, or the free one where it belongs.
 uint64_t &slot_of(state_store &store, const std::byte *bytes, size_t size, uint64_t hash)
 {
     const size_t mask = store.table.size() - 1;
@@ -88,7 +91,7 @@ uint64_t &slot_of(state_store &store, const std::byte *bytes, size_t size, uint6
         }
         if ((slot & TAG_MASK) == (hash & TAG_MASK)) {
             const state_place place = (slot >> TAG_BITS) - 1;
-            if (head_at(store, place).size == size && memcmp(difference_at(store, place), bytes, size) == 0) {
+            if (head_at(store, place).size == size && memcmp(columns_at(store, place), bytes, size) == 0) {
                 return slot;
             }
         }
@@ -100,7 +103,7 @@ void grow_table(state_store &store)
     store.table.assign(store.table.size() * 2, 0);
     const size_t mask = store.table.size() - 1;
     for (state_place place = 0; place < store.used; place = next_state(store, place)) {
-        const uint64_t hash = hash_of(difference_at(store, place), head_at(store, place).size);
+        const uint64_t hash = hash_of(columns_at(store, place), head_at(store, place).size);
         size_t at = hash >> TAG_BITS & mask;
         while (store.table[at] != 0) {
             at = (at + 1) & mask;
@@ -109,22 +112,29 @@ void grow_table(state_store &store)
     }
 }
 
-void take_difference(state_store &store, difference &out)
+void take_columns(state_store &store, const snapshot &now, column_bytes &out)
 {
-    static snapshot now;
-    take_snapshot(now);
     if (store.states == 0) {
         store.first = now;
+        store.constant.bytes.fill(std::byte{0xff});
+        store.columns.clear();
     }
-    compare(store.first, now, snapshot_size(), out);
+    if (differs_outside_columns(store, now)) {
+        add_columns(store, now);
+    }
+    out.size = store.columns.size();
+    for (size_t i = 0; i < out.size; i++) {
+        out.bytes[i] = now.bytes[store.columns[i]];
+    }
+    while (out.size > 0 && out.bytes[out.size - 1] == store.first.bytes[store.columns[out.size - 1]]) {
+        out.size--;
+    }
 }
 
-void append(state_store &store, state_place parent, size_t stimulus, const difference &state)
+void append(state_store &store, state_place parent, size_t stimulus, const column_bytes &state)
 {
-    state_head head = {.size = static_cast<uint16_t>(state.size),
-                       .stimulus = static_cast<uint8_t>(stimulus),
-                       .marked = 0,
-                       .parent = {}};
+    state_head head = {
+        .size = static_cast<uint16_t>(state.size), .stimulus = static_cast<uint8_t>(stimulus), .parent = {}};
     const uint64_t from = parent + 1; // NO_STATE becomes 0
     memcpy(head.parent, &from, sizeof head.parent);
     memcpy(store.memory + store.used, &head, sizeof head);
@@ -141,6 +151,7 @@ void open_store(state_store &store)
         perror("kiv_led_explore: no address space for the states");
         abort();
     }
+    madvise(memory, RESERVED, MADV_HUGEPAGE); // looking states up is reading at random
     store.memory = static_cast<std::byte *>(memory);
     store.used = 0;
     store.states = 0;
@@ -159,10 +170,10 @@ uint64_t bytes_of(const state_store &store)
     return store.used + store.table.size() * sizeof(uint64_t);
 }
 
-found_state add_state(state_store &store, state_place parent, size_t stimulus)
+found_state add_state(state_store &store, const snapshot &now, state_place parent, size_t stimulus)
 {
-    static difference state;
-    take_difference(store, state);
+    static column_bytes state;
+    take_columns(store, now, state);
     const uint64_t hash = hash_of(state.bytes.data(), state.size);
     uint64_t &slot = slot_of(store, state.bytes.data(), state.size, hash);
     if (slot != 0) {
@@ -177,27 +188,28 @@ found_state add_state(state_store &store, state_place parent, size_t stimulus)
     return {place, true};
 }
 
-state_place find_state(state_store &store)
+state_place find_state(state_store &store, const snapshot &now)
 {
-    static difference state;
-    take_difference(store, state);
+    static column_bytes state;
+    take_columns(store, now, state);
     const uint64_t hash = hash_of(state.bytes.data(), state.size);
     const uint64_t slot = slot_of(store, state.bytes.data(), state.size, hash);
     return slot == 0 ? NO_STATE : (slot >> TAG_BITS) - 1;
 }
 
+size_t differing_bytes(const state_store &store, const snapshot &now)
+{
+    return static_cast<size_t>(std::count_if(store.columns.begin(), store.columns.end(),
+                                             [&](uint16_t at) { return now.bytes[at] != store.first.bytes[at]; }));
+}
+
 void read_state(const state_store &store, state_place place, snapshot &into)
 {
-    const std::byte *bytes = difference_at(store, place);
-    const std::byte *end = bytes + head_at(store, place).size;
-    size_t at = 0;
+    const std::byte *bytes = columns_at(store, place);
+    const size_t size = head_at(store, place).size;
     memcpy(into.bytes.data(), store.first.bytes.data(), snapshot_size());
-    while (bytes < end) {
-        const size_t skip = std::to_integer<size_t>(*bytes++);
-        at += skip;
-        if (skip < SKIP_MOST) {
-            into.bytes[at++] = *bytes++;
-        }
+    for (size_t i = 0; i < size; i++) {
+        into.bytes[store.columns[i]] = bytes[i];
     }
 }
 
@@ -217,14 +229,4 @@ state_place parent_of(const state_store &store, state_place place)
 size_t stimulus_into(const state_store &store, state_place place)
 {
     return head_at(store, place).stimulus;
-}
-
-bool is_marked(const state_store &store, state_place place)
-{
-    return head_at(store, place).marked != 0;
-}
-
-void mark(state_store &store, state_place place)
-{
-    store.memory[place + offsetof(state_head, marked)] = std::byte{1};
 }

@@ -1,5 +1,5 @@
-// The visited states, kept exactly: each as its difference from the first one, in one stretch of memory and in the
-// order in which they were found, so that reading on from a state is exploring breadth first.
+// The visited states, kept exactly: of each the bytes that are not the same in all of them, in one stretch of memory
+// and in the order in which they were found, so that reading on from a state is exploring breadth first.
 #pragma once
 
 #include "daemon.h"
@@ -16,6 +16,8 @@ struct state_store {
     std::vector<uint64_t> table; // open addressing: place and a tag of the hash; 0 is free
     uint64_t states = 0;
     snapshot first;
+    snapshot constant;             // all bits set in each byte in which no state differs from the first one so far
+    std::vector<uint16_t> columns; // the other bytes, in the order in which they were seen to differ
 };
 
 struct found_state {
@@ -27,18 +29,13 @@ void open_store(state_store &store); // empty. Aborts when no address space is t
 void close_store(state_store &store);
 uint64_t bytes_of(const state_store &store);
 
-// Looks the world and the daemon as they stand now up, or adds them: reached from parent by a stimulus. The first
-// state that is added is the one from which all differences are taken.
-found_state add_state(state_store &store, state_place parent, size_t stimulus);
+// Looks a state up, or adds it: reached from parent by a stimulus.
+found_state add_state(state_store &store, const snapshot &now, state_place parent, size_t stimulus);
+state_place find_state(state_store &store, const snapshot &now); // NO_STATE when it is not there
 
-// The place of the state as it stands now, or NO_STATE.
-state_place find_state(state_store &store);
+size_t differing_bytes(const state_store &store, const snapshot &now); // from the first state
 
 void read_state(const state_store &store, state_place place, snapshot &into);
 state_place next_state(const state_store &store, state_place place); // store.used behind the last
 state_place parent_of(const state_store &store, state_place place);  // NO_STATE for the first
 size_t stimulus_into(const state_store &store, state_place place);
-
-// A mark that a pass over the states may leave.
-bool is_marked(const state_store &store, state_place place);
-void mark(state_store &store, state_place place);
