@@ -1,13 +1,26 @@
 #!/usr/bin/env python3
 """A fault in the daemon is found by the property that should find it, and its history shows it on a real daemon:
-fault_test.py EXPLORER PROPERTY STEPS OPTION..."""
+fault_test.py EXPLORER PLAY PROPERTY STEPS OPTION...
+
+PLAY is the command that plays a scenario with the program that has the same fault.
+"""
 import re
 import subprocess
 import sys
+import tempfile
+from pathlib import Path
 
-explorer, wanted, steps, *options = sys.argv[1:]
+explorer, play, wanted, steps, *options = sys.argv[1:]
 outcome = subprocess.run([explorer, "--single", *options], check=False, capture_output=True, text=True)
-found = re.findall(r"^# Broken: .*?\(unknown (\d+) (.*?)\).* history, (\d+) steps", outcome.stdout, re.MULTILINE)
-print(*found, sep="\n")
-if outcome.returncode != 1 or (wanted, steps) not in [(broken, length) for broken, _, length in found]:
-    sys.exit(f"property {wanted} should break after {steps} steps\n{outcome.stdout}{outcome.stderr}")
+histories = [
+    history
+    for history in outcome.stdout.split("\n# Broken: ")[1:]
+    if re.match(rf".*?\(unknown {wanted} .*?\).* history, {steps} steps:\n", history)
+]
+print(outcome.stdout)
+if outcome.returncode != 1 or not histories:
+    sys.exit(f"property {wanted} should break after {steps} steps\n{outcome.stderr}")
+with tempfile.TemporaryDirectory() as folder:
+    for number, history in enumerate(histories):
+        Path(folder, f"{number}.scn").write_text(history.split("\n", 1)[1])
+    sys.exit(subprocess.run([*play.split(), folder], check=False).returncode)
