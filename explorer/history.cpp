@@ -120,28 +120,35 @@ std::string last_words(const breach &what)
     }
     return what.broken == NO_NOISE ? "expect requests " + std::to_string(happened.led_requests) + "\n" : "";
 }
-} // namespace
+// A line of the device's furniture, as far as the daemon has read what it sets.
+std::string needed_of(const std::string &line)
+{
+    std::istringstream words(line);
+    std::string what;
+    std::string kept;
+    words >> what;
+    if (what == "battery" || what == "charger") {
+        return was_read("bsp/" + what) ? line + "\n" : "";
+    }
+    if (what != "nv") {
+        return line + "\n";
+    }
+    for (std::string word; words >> word;) {
+        kept += was_read("nv/" + word.substr(0, word.find('='))) ? " " + word : "";
+    }
+    return kept.empty() ? "" : what + kept + "\n";
+}
 
-// What the device holds at rest, as far as the daemon has read it.
-static std::string needed_furniture(unsigned product)
+std::string needed_furniture(unsigned product)
 {
     std::istringstream lines(furniture(product));
     std::string needed;
     for (std::string line; std::getline(lines, line);) {
-        std::istringstream words(line);
-        std::string what;
-        std::string kept;
-        words >> what;
-        for (std::string word; what == "nv" && words >> word;) {
-            kept += was_read("nv/" + word.substr(0, word.find('='))) ? " " + word : "";
-        }
-        const bool is_board = what == "battery" || what == "charger";
-        if (what != "nv" ? !is_board || was_read("bsp/" + what) : !kept.empty()) {
-            needed += (what == "nv" ? what + kept : line) + "\n";
-        }
+        needed += needed_of(line);
     }
     return needed;
 }
+} // namespace
 
 told_history tell_history(unsigned product, const std::vector<stimulus> &alphabet, const std::vector<size_t> &history,
                           const std::string &epilogue, const breach &what)
