@@ -71,9 +71,8 @@ void settle_excuses(unsigned product)
     drop_unless(is_message_timed(), MESSAGE_TIMER_LEFT);
     drop_unless(is_signal_lit, LEVEL_SHOWN_AGAIN);
     drop_unless(look_at(world.leds[LED_BAT_RED]) == led_look{led_mode::ON, 4, 0, 0}, SELF_TESTED);
-    const bool is_lit_as_another = is_signal_lit || is_lit(world.leds[LED_SIG_6]);
     excuse_by(is_excused(CONFIGURATION_UNREAD) ? LIT_AS_ANOTHER : 0);
-    drop_unless(is_lit_as_another, LIT_AS_ANOTHER);
+    drop_unless(is_signal_lit || is_lit(world.leds[LED_SIG_6]), LIT_AS_ANOTHER);
     drop_excuse(happened.accepted);
     excuse_by(happened.refused);
     happened.accepted = 0;
@@ -192,7 +191,9 @@ void act_on(const action &one, unsigned product)
     case verb::SEND:
         hear(product, one);
         deliver(one.message);
-        drop_unless(world.asleep != 0 || !is_net_type(one) || !is_net_lit(), NET_CHANGED_ASLEEP);
+        if (world.asleep == 0 && is_net_type(one) && is_net_lit()) {
+            drop_excuse(NET_CHANGED_ASLEEP); // it has been read again
+        }
         break;
     case verb::INDICATE:
         indicate(static_cast<int>(one.number));

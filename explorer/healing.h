@@ -8,7 +8,7 @@
 
 // A way of switching off and on again.
 struct power_cycle {
-    stimulus off; // awake
+    stimulus off; // and awake
     stimulus on;
     bool restarts; // the daemon
 };

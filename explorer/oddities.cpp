@@ -115,8 +115,8 @@ constexpr oddity oddity_rows[] = {
          return (is_excused(CONFIGURATION_UNREAD) && !what.restarted) ||
                 (is_excused(LIT_AS_ANOTHER) && is_of(what, {LED_SIG_6, LED_SIG_BLUE}));
      },
-     "When the device configuration cannot be read at the start, the daemon serves another product: what it shows stays "
-     "wrong when the device is switched off and on, and only a restart reads the configuration again. A module "
+     "When the device configuration cannot be read at the start, the daemon serves another product: what it shows "
+     "stays wrong when the device is switched off and on, and only a restart reads the configuration again. A module "
      "terminal then keeps the signal LEDs that it has lit as another product."},
     {"settings-read-at-the-start", ON_UFI | ON_MODULE | ON_UNI_CORE, bit(FAILURES_HEAL),
      [](const breach &what) { return is_excused(SETTINGS_UNREAD) && is_gated_at_night(what.led); },
@@ -181,7 +181,9 @@ constexpr oddity oddity_rows[] = {
      "A sleep value that is neither asleep nor awake reaches a device that is off. Switched on, most of it counts "
      "as awake, but Wi-Fi stays dark until the next wake-up."},
     {"suspended-night-goes-on", ON_UFI | ON_MODULE | ON_UNI_CORE, HEALS,
-     [](const breach &what) { return may_be_night() && is_gated_at_night(what.led) && nv_is("nv/night_mode_switch", "2"); },
+     [](const breach &what) {
+         return may_be_night() && is_gated_at_night(what.led) && nv_is("nv/night_mode_switch", "2");
+     },
      "Night mode is suspended in the middle of a night, and the night goes on: only a restart, or the morning, "
      "ends it."},
     {"net-change-asleep", ON_EVERY & ~ON_MODULE, NOISE,

@@ -52,13 +52,10 @@ bool leads_back(searching &in, state_place place)
     const unsigned families = in.plan.families & ~unsigned{POWER};
     unsigned some = 0;
     bool is_back = leads_back_by(in, place, in.alphabet, FEW_STATES);
-    while (!is_back && is_interrupted == 0) {
-        is_back = leads_back_by(in, place, alphabet_of(in.plan.product, some), MANY_STATES);
+    do {
+        is_back = is_back || leads_back_by(in, place, alphabet_of(in.plan.product, some), MANY_STATES);
         some = (some - families) & families; // the next set of them
-        if (some == 0) {
-            break;
-        }
-    }
+    } while (!is_back && some != 0 && is_interrupted == 0);
     return is_back;
 }
 } // namespace
