@@ -17,7 +17,7 @@ constexpr int64_t US_PER_S = 1'000'000;
 constexpr const char *MISSING = "missing";
 constexpr const char *MISSING_ITEM = " missing";
 
-// A value of the device as a statement sets it: "nv battery_value=", "sensor 3 ".
+// A value of the device as a statement sets it: "nv battery_value=" and "80", "cfg 6000" and "=80" or " missing".
 struct setting {
     std::string statement;
     std::string value;
